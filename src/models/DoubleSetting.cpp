@@ -1,0 +1,51 @@
+#include "wavemill/models/DoubleSetting.h"
+
+#include "wavemill/models/SettingVisitor.h"
+
+#include <cerrno>
+#include <cstdio>
+#include <cstdlib>
+#include <limits>
+
+namespace Corvane::Wavemill {
+
+DoubleSetting::DoubleSetting() : DoubleSetting("") {}
+DoubleSetting::DoubleSetting(const char *name)
+    : DoubleSetting(name, 0.0, std::numeric_limits<double>::lowest(), std::numeric_limits<double>::max(), 0.0) {}
+DoubleSetting::DoubleSetting(const char *name, double value, double minimum, double maximum, double step)
+    : NumericSetting<double>(name, value, minimum, maximum, step) {}
+
+std::string DoubleSetting::toString() const {
+  char text[32];
+  std::snprintf(text, sizeof text, "%.15g", value);
+  return text;
+}
+
+bool DoubleSetting::parse(const std::string &text) {
+  const char *begin = text.c_str();
+  char *end = nullptr;
+  errno = 0;
+  const double read = std::strtod(begin, &end);
+  if (end == begin || errno == ERANGE)
+    return false;
+  value = read;
+  return true;
+}
+
+double DoubleSetting::getDouble() const { return value; }
+void DoubleSetting::setCommonValue(double v) { setValue(v); }
+void DoubleSetting::visit(SettingVisitor *visitor) { visitor->dispatch(this); }
+
+double DoubleSetting::validateValue(const double &v) const {
+  // The half step is added to the value, not used to round it: the stored
+  // result is v + step / 2. Applications depend on this exact arithmetic.
+  if (step > 0)
+    return (v / step + 0.5) * step;
+  if (v > maximum)
+    return maximum;
+  if (minimum > v)
+    return minimum;
+  return v;
+}
+
+} // namespace Corvane::Wavemill

@@ -1,0 +1,184 @@
+#include "wavemill/models/RunTime.h"
+
+#include <gtest/gtest.h>
+
+#include <string>
+
+using Corvane::Wavemill::RunTime;
+
+namespace {
+
+const std::string resultPrefix =
+    "class std::basic_string<char,struct std::char_traits<char>,class std::allocator<char> > __cdecl ";
+
+std::string fullName(const std::string &signature) {
+  return RunTime::doGetFullTypeName(signature.c_str(), static_cast<int>(signature.size()) + 1);
+}
+
+std::string shortName(const std::string &signature) {
+  return RunTime::doGetTypeName(signature.c_str(), static_cast<int>(signature.size()) + 1);
+}
+
+} // namespace
+
+// Small classes that name themselves the way the model classes do; the names
+// are unusual so that they cannot meet a real class of the test program.
+struct RunTimeProbePlain {
+  const std::string &getTypeName() const { return WAVEMILL_TYPE_NAME(); }
+  const std::string &getFullTypeName() const { return WAVEMILL_FULL_TYPE_NAME(); }
+};
+
+namespace Corvane::Wavemill {
+
+class RunTimeProbeBase {
+public:
+  virtual ~RunTimeProbeBase() = default;
+  virtual const std::string &getTypeName() const = 0;
+  virtual std::string getFullTypeName() const = 0;
+};
+
+class RunTimeProbeModel : public RunTimeProbeBase {
+public:
+  const std::string &getTypeName() const override { return WAVEMILL_TYPE_NAME(); }
+  std::string getFullTypeName() const override { return WAVEMILL_FULL_TYPE_NAME(); }
+};
+
+struct RunTimeProbePair {};
+
+template <class T> class RunTimeProbeCollection : public RunTimeProbeBase {
+public:
+  const std::string &getTypeName() const override { return WAVEMILL_TYPE_NAME(); }
+  virtual std::string getFullTypeName() const override { return WAVEMILL_FULL_TYPE_NAME(); }
+};
+
+namespace Deep::Deeper {
+struct RunTimeProbeInner {
+  static std::string getFullTypeName() { return WAVEMILL_FULL_TYPE_NAME(); }
+};
+} // namespace Deep::Deeper
+
+} // namespace Corvane::Wavemill
+
+TEST(RunTimeTest, MicrosoftSignaturesGiveFullAndShortNames) {
+  const auto textModel = resultPrefix + "Corvane::Wavemill::TextModel::getFullTypeName(void) const";
+  EXPECT_EQ(fullName(textModel), "Corvane.Wavemill.TextModel");
+  EXPECT_EQ(shortName(textModel), "TextModel");
+
+  const auto collection =
+      resultPrefix +
+      "Corvane::Wavemill::ModelCollection<class Corvane::Wavemill::TextPair>::getFullTypeName(void) const";
+  EXPECT_EQ(fullName(collection), "Corvane::Wavemill::ModelCollection`1[[Corvane::Wavemill::TextPair]]");
+  EXPECT_EQ(shortName(collection), "ModelCollection`1[[TextPair]]");
+
+  const auto box = resultPrefix + "Corvane::Wavemill::Box<int>::getFullTypeName(void) const";
+  EXPECT_EQ(fullName(box), "Corvane::Wavemill::Box`1[[int]]");
+  EXPECT_EQ(shortName(box), "Box`1[[int]]");
+
+  const auto plain = resultPrefix + "Plain::getFullTypeName(void) const";
+  EXPECT_EQ(fullName(plain), "Plain");
+  EXPECT_EQ(shortName(plain), "Plain");
+}
+
+TEST(RunTimeTest, NestedTemplateArgumentKeepsItsKnownOddNames) {
+  // The nearest "<" is the inner one, so the outer class is not recognised.
+  const auto nested = resultPrefix + "ModelCollection<class ModelCollection<class Foo> >::getFullTypeName(void) const";
+  EXPECT_EQ(shortName(nested), "ModelCollection`1[[Foo> ]]");
+  EXPECT_EQ(fullName(nested), ">");
+}
+
+TEST(RunTimeTest, TextWithoutClassGivesEmptyNames) {
+  EXPECT_EQ(RunTime::doGetFullTypeName("", 1), "");
+  EXPECT_EQ(RunTime::doGetTypeName("", 1), "");
+  EXPECT_EQ(RunTime::doGetFullTypeName(nullptr, 0), "");
+  EXPECT_EQ(RunTime::doGetTypeName(nullptr, 0), "");
+  EXPECT_EQ(RunTime::fullTypeNameOf(""), "");
+  EXPECT_EQ(RunTime::typeNameOf(nullptr), "");
+  // A size that ends the text before its last "::" hides the class.
+  const std::string signature = "void A::f(void)";
+  EXPECT_EQ(RunTime::doGetFullTypeName(signature.c_str(), 3), "");
+  EXPECT_EQ(RunTime::doGetTypeName(signature.c_str(), 3), "");
+}
+
+TEST(RunTimeTest, LastIndexOfSearchesDownFromStartAndStaysInsideText) {
+  const char *text = "a:b:c";
+  EXPECT_EQ(RunTime::lastIndexOf(text, ':', 5), 3); // 5 is the terminator's index
+  EXPECT_EQ(RunTime::lastIndexOf(text, ':', 3), 3);
+  EXPECT_EQ(RunTime::lastIndexOf(text, ':', 2), 1);
+  EXPECT_EQ(RunTime::lastIndexOf(text, 'a', 4), 0);
+  EXPECT_EQ(RunTime::lastIndexOf(text, ':', 0), -1);
+  EXPECT_EQ(RunTime::lastIndexOf(text, 'x', 5), -1);
+  EXPECT_EQ(RunTime::lastIndexOf(text, ':', -1), -1);
+  EXPECT_EQ(RunTime::lastIndexOf("", '\0', 0), -1);
+  EXPECT_EQ(RunTime::lastIndexOf(nullptr, ':', 0), -1);
+  // A start past the end is read as the end, not as memory behind the text.
+  EXPECT_EQ(RunTime::lastIndexOf(text, ':', 1000), 3);
+}
+
+TEST(RunTimeTest, ShortClassNameTakesTextBehindLastColonElseLastInnerBlank) {
+  EXPECT_EQ(RunTime::getShortClassName("class Corvane::Wavemill::TextPair"), "TextPair");
+  EXPECT_EQ(RunTime::getShortClassName("class TextPair"), "TextPair");
+  EXPECT_EQ(RunTime::getShortClassName("int"), "int");
+  EXPECT_EQ(RunTime::getShortClassName(""), "");
+  // A blank that ends the name is not the one in front of the class.
+  EXPECT_EQ(RunTime::getShortClassName("class Foo> "), "Foo> ");
+  // Neither a colon nor a blank at the very start separates anything.
+  EXPECT_EQ(RunTime::getShortClassName(":Foo"), ":Foo");
+  EXPECT_EQ(RunTime::getShortClassName(" Foo"), " Foo");
+}
+
+TEST(RunTimeTest, AdaptSignatureRewritesGccMemberText) {
+  EXPECT_EQ(RunTime::adaptSignature("virtual std::string Corvane::Wavemill::TextModel::getFullTypeName() const"),
+            "std::string Corvane::Wavemill::TextModel::getFullTypeName(void) const");
+  EXPECT_EQ(
+      RunTime::adaptSignature("std::string Corvane::Wavemill::ModelCollection<T>::getFullTypeName() const [with T "
+                              "= Corvane::Wavemill::TextPair; std::string = std::__cxx11::basic_string<char>]"),
+      "std::string Corvane::Wavemill::ModelCollection<Corvane::Wavemill::TextPair>::getFullTypeName(void) const");
+  EXPECT_EQ(RunTime::adaptSignature("static const std::string& Plain::name(int, const char*)"),
+            "const std::string& Plain::name(void)");
+  // Several parameters, values with their own commas and templates, a
+  // parameter named like the namespace in front of it, a pack.
+  EXPECT_EQ(RunTime::adaptSignature("void N::Pair<K, N>::f() const [with K = std::map<int, std::vector<char> >; int N "
+                                    "= 2]"),
+            "void N::Pair<std::map<int, std::vector<char> >, 2>::f(void) const");
+  EXPECT_EQ(RunTime::adaptSignature("void Box<T>::f() && [with T = Box<int>]"), "void Box<Box<int> >::f(void) &&");
+  EXPECT_EQ(RunTime::adaptSignature("void Tuple<Ts>::f() [with Ts = {int, char}]"), "void Tuple<int, char>::f(void)");
+  EXPECT_EQ(RunTime::adaptSignature("void Ch<C>::f() const [with char C = ';']"), "void Ch<';'>::f(void) const");
+  EXPECT_EQ(RunTime::adaptSignature("void A::operator()(std::function<void(int)>) const"),
+            "void A::operator()(void) const");
+
+  const char *box = "std::string Corvane::Wavemill::Box<T>::getFullTypeName() const [with T = int; std::string = "
+                    "std::__cxx11::basic_string<char>]";
+  EXPECT_EQ(RunTime::fullTypeNameOf(box), "Corvane::Wavemill::Box`1[[int]]");
+  EXPECT_EQ(RunTime::typeNameOf(box), "Box`1[[int]]");
+  EXPECT_EQ(RunTime::fullTypeNameOf("std::string Plain::getFullTypeName() const"), "Plain");
+  EXPECT_EQ(RunTime::typeNameOf("std::string Plain::getFullTypeName() const"), "Plain");
+}
+
+TEST(RunTimeTest, MacrosNameTheClassOfTheEnclosingMember) {
+  using namespace Corvane::Wavemill;
+  const RunTimeProbeModel model;
+  const RunTimeProbeBase &asBase = model;
+  EXPECT_EQ(asBase.getTypeName(), "RunTimeProbeModel");
+  EXPECT_EQ(asBase.getFullTypeName(), "Corvane.Wavemill.RunTimeProbeModel");
+
+  const RunTimeProbeCollection<RunTimeProbePair> pairs;
+  EXPECT_EQ(pairs.getTypeName(), "RunTimeProbeCollection`1[[RunTimeProbePair]]");
+  EXPECT_EQ(pairs.getFullTypeName(),
+            "Corvane::Wavemill::RunTimeProbeCollection`1[[Corvane::Wavemill::RunTimeProbePair]]");
+
+  const RunTimeProbeCollection<int> numbers;
+  EXPECT_EQ(numbers.getTypeName(), "RunTimeProbeCollection`1[[int]]");
+  EXPECT_EQ(numbers.getFullTypeName(), "Corvane::Wavemill::RunTimeProbeCollection`1[[int]]");
+
+  const RunTimeProbePlain plain;
+  EXPECT_EQ(plain.getTypeName(), "RunTimeProbePlain");
+  EXPECT_EQ(plain.getFullTypeName(), "RunTimeProbePlain");
+
+  EXPECT_EQ(Deep::Deeper::RunTimeProbeInner::getFullTypeName(), "Corvane.Wavemill.Deep.Deeper.RunTimeProbeInner");
+
+  // The compiler's own text of a nested collection ends in the same odd
+  // names as the signature form.
+  const RunTimeProbeCollection<RunTimeProbeCollection<RunTimeProbePair>> nested;
+  EXPECT_EQ(nested.getTypeName(), "RunTimeProbeCollection`1[[RunTimeProbePair> ]]");
+  EXPECT_EQ(nested.getFullTypeName(), ">");
+}

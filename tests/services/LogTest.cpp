@@ -1,0 +1,113 @@
+#include "wavemill/services/Log.h"
+#include "wavemill/models/Prototype.h"
+#include "wavemill/services/LogBase.h"
+
+#include <gtest/gtest.h>
+
+#include <memory>
+#include <regex>
+#include <string>
+#include <vector>
+
+using namespace Corvane::Wavemill;
+
+namespace {
+
+// Keeps the printed line of every record a channel publishes; the record
+// itself is gone once the call returns.
+class LineProbe {
+public:
+  explicit LineProbe(LogBase &channel)
+      : subscription(channel.getSubject().get_observable().subscribe([this](LogMessage *message) {
+          lines.push_back(message->toString());
+          stamped.push_back(message->timeStamp);
+        })) {}
+  ~LineProbe() { subscription.unsubscribe(); }
+
+  std::vector<std::string> lines;
+  std::vector<bool> stamped;
+
+private:
+  rxcpp::subscription subscription;
+};
+
+class AuditLog : public Log {
+public:
+  AuditLog() : Log("Audit") {}
+};
+
+const LogBase::Creator<AuditLog> auditCreator;
+
+const std::string timePattern = "\\[\\d{4}-\\d{2}-\\d{2}\\.\\d{2}:\\d{2}:\\d{2}\\] ";
+
+} // namespace
+
+TEST(LogTest, LevelTextsArePaddedAndOtherLevelsAreEmpty) {
+  const std::vector<std::string> expected{"[TRACE] ", "[DEBUG] ",    "[INFO]  ", "[WARN]  ",
+                                          "[ERR]   ", "[CRITICAL] ", "[OFF] "};
+  for (int level = 0; level < 7; ++level)
+    EXPECT_EQ(LogBase::toString(level), expected[level]) << level;
+  EXPECT_EQ(LogBase::toString(-1), "");
+  EXPECT_EQ(LogBase::toString(7), "");
+  EXPECT_EQ(LogMessage("Net", 42, "odd", false).toString(), "[Net]odd");
+}
+
+TEST(LogTest, GetServesRegisteredChannelsAndTheDefaultChannelForOtherNames) {
+  EXPECT_EQ(LogBase::get("Log"), Prototype::getInstance<Log>());
+  EXPECT_EQ(LogBase::get("Log")->toString(), "Log");
+  EXPECT_NE(std::dynamic_pointer_cast<AuditLog>(LogBase::get("Audit")), nullptr);
+  for (const char *name : {"Missing", "", "log"})
+    EXPECT_EQ(LogBase::get(name), Prototype::getInstance<LogBase>()) << name;
+}
+
+TEST(LogTest, QuietChannelPublishesToObserversAndPrintsNothing) {
+  Log log("Quiet");
+  testing::internal::CaptureStdout();
+  log.write(2, "before anyone listens");
+  LineProbe probe(log);
+  log.write(3, "disk low");
+  EXPECT_EQ(testing::internal::GetCapturedStdout(), "");
+  EXPECT_EQ(probe.lines, std::vector<std::string>{"[Quiet][WARN]  disk low"});
+}
+
+TEST(LogTest, ConsolePrintsEachLineWithTheTimeOnlyWhereTheFlagAsks) {
+  Log log("Chan");
+  log.setConsole(true);
+  LineProbe probe(log);
+  testing::internal::CaptureStdout();
+  log.write(2, "hello");
+  log.setTimeStamp(true);
+  log.write(4, "boom");
+  // The line shows the flag the message came with; observers get the channel's.
+  LogMessage message("Other", 1, "x", false);
+  log.writeMessage(&message);
+  log.writeMessage(nullptr);
+  const std::string printed = testing::internal::GetCapturedStdout();
+  EXPECT_TRUE(std::regex_match(printed, std::regex("\\[Chan\\]\\[INFO\\]  hello\n\\[Chan\\]\\[ERR\\]   " + timePattern +
+                                                   "boom\n\\[Other\\]\\[DEBUG\\] x\n")))
+      << printed;
+  EXPECT_EQ(probe.stamped, (std::vector<bool>{false, true, true}));
+}
+
+TEST(LogTest, WriteLogTextGoesToTheOneLogWhileSharedAndToNamedChannelsOtherwise) {
+  LineProbe toLog(*Prototype::getInstance<Log>());
+  LineProbe toAudit(*LogBase::get("Audit"));
+  LineProbe toDefault(*Prototype::getInstance<LogBase>());
+
+  ASSERT_TRUE(Log::getShared());
+  Log::writeLogText("Audit", 4, "shared");
+  Log::setShared(false);
+  Log::writeLogText("Audit", 3, "own");
+  Log::writeLogText("Nobody", 1, "fallback");
+  Log::setShared(true);
+
+  EXPECT_EQ(toLog.lines, std::vector<std::string>{"[Audit][ERR]   shared"});
+  EXPECT_EQ(toAudit.lines, std::vector<std::string>{"[Audit][WARN]  own"});
+  EXPECT_EQ(toDefault.lines, std::vector<std::string>{"[LogBase][DEBUG] fallback"});
+}
+
+TEST(LogTest, MessageLineTakesTheTimeOnlyWhenStamped) {
+  EXPECT_EQ(LogMessage("Net", 5, "down", false).toString(), "[Net][CRITICAL] down");
+  const std::string stamped = LogMessage("Net", 0, "up", true).toString();
+  EXPECT_TRUE(std::regex_match(stamped, std::regex("\\[Net\\]\\[TRACE\\] " + timePattern + "up"))) << stamped;
+}
