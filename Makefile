@@ -12,7 +12,7 @@ CONSUMER_DIR := $(CURDIR)/build/consumer
 all: test
 
 bootstrap:
-	@scripts/bootstrap
+	@bash scripts/bootstrap
 
 test: bootstrap
 	cmake --preset dev
@@ -46,10 +46,12 @@ bench: bootstrap
 	[ $$found = 1 ] || echo "bench: no benchmarks"
 
 format: bootstrap
-	scripts/format
+	python3 scripts/umbrella
+	bash scripts/format
 
 format-check: bootstrap
-	scripts/format --check
+	bash scripts/format --check
+	python3 scripts/umbrella --check
 
 # Installs the release library into build/install, then builds the consumer
 # project against that tree with CMake and with pkg-config and runs both.

@@ -11,26 +11,12 @@
 #include "wavemill/models/Interceptor.h"
 #include "wavemill/models/ModelBase.h"
 
+#include "AllocationCounter.h"
+
 #include <benchmark/benchmark.h>
 
-#include <atomic>
-#include <cstdlib>
 #include <functional>
 #include <mutex>
-#include <new>
-
-namespace {
-std::atomic<long long> allocations{0};
-} // namespace
-
-void *operator new(std::size_t size) {
-  allocations.fetch_add(1, std::memory_order_relaxed);
-  if (void *p = std::malloc(size ? size : 1))
-    return p;
-  throw std::bad_alloc();
-}
-void operator delete(void *p) noexcept { std::free(p); }
-void operator delete(void *p, std::size_t) noexcept { std::free(p); }
 
 using namespace Corvane::Wavemill;
 
@@ -55,18 +41,7 @@ struct ActiveTree {
   long long couples = 0;
 };
 
-class AllocationCount {
-public:
-  explicit AllocationCount(benchmark::State &state) : state(state), start(allocations.load()) {}
-  ~AllocationCount() {
-    state.counters["allocs"] =
-        benchmark::Counter(static_cast<double>(allocations.load() - start), benchmark::Counter::kAvgIterations);
-  }
-
-private:
-  benchmark::State &state;
-  long long start;
-};
+using wavemill_bench::AllocationCount;
 
 void BaselineMutexAndFunction(benchmark::State &state) {
   std::mutex mutex;

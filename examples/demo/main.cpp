@@ -20,8 +20,7 @@ class Generator : public ModelBase {
 public:
   Generator() : ModelBase("Demo::Generator") {}
 
-  std::shared_ptr<DoubleSetting> frequency =
-      init(std::make_shared<DoubleSetting>("Frequency", 1e6, 1.0, 6e9, 0.0));
+  std::shared_ptr<DoubleSetting> frequency = init(std::make_shared<DoubleSetting>("Frequency", 1e6, 1.0, 6e9, 0.0));
   std::shared_ptr<DoubleSetting> period = init(std::make_shared<DoubleSetting>("Period", 1e-6, 0.0, 1.0, 0.0));
   std::shared_ptr<BoolSetting> output = init(std::make_shared<BoolSetting>("Output"));
   std::shared_ptr<StringSetting> label = init(std::make_shared<StringSetting>("Label", "CW"));
@@ -39,8 +38,8 @@ void roadOfAChange() {
   generator->setCouplings(std::make_shared<Couplings>([&couplings](ModelBase *model, Transaction *transaction) {
     auto &g = static_cast<Generator &>(*model);
     ++couplings;
-    std::cout << "  coupling #" << couplings << " (started by " << transaction->getSetting()->getName()
-              << ", method '" << transaction->getMethodName() << "')\n";
+    std::cout << "  coupling #" << couplings << " (started by " << transaction->getSetting()->getName() << ", method '"
+              << transaction->getMethodName() << "')\n";
     g.period->setValue(1.0 / g.frequency->getValue());
   }));
 

@@ -47,8 +47,23 @@ Interceptor *Interceptor::empty() {
   return &instance;
 }
 
+// Read on every write of a setting: a constant-initialised thread-local
+// needs no guard, and the initial-exec model reaches it without a call into
+// the dynamic loader.
+#if defined(__GNUC__) && !defined(_WIN32)
+#define WAVEMILL_FAST_TLS __attribute__((tls_model("initial-exec")))
+#else
+#define WAVEMILL_FAST_TLS
+#endif
+
+namespace {
+thread_local std::uint32_t threadIdOfThisThread WAVEMILL_FAST_TLS = 0;
+} // namespace
+
 std::uint32_t Interceptor::currentThreadId() {
-  thread_local const std::uint32_t id = nextThreadId();
+  std::uint32_t id = threadIdOfThisThread;
+  if (id == 0)
+    threadIdOfThisThread = id = nextThreadId();
   return id;
 }
 

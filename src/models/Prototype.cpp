@@ -33,8 +33,7 @@ void Prototype::setCachedItem(std::type_index type, std::shared_ptr<void> item) 
   impl->items[type] = std::move(item);
 }
 
-std::shared_ptr<void> Prototype::getOrCreate(std::type_index type,
-                                             const std::function<std::shared_ptr<void>()> &make) {
+std::shared_ptr<void> Prototype::getOrCreate(std::type_index type, const std::function<std::shared_ptr<void>()> &make) {
   auto &prototypes = getPrototypeInstance();
   if (auto cached = prototypes.getCachedItem(type))
     return cached;

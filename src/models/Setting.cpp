@@ -44,7 +44,8 @@ std::shared_ptr<IConverter> Setting::getConverter() const { return converter; }
 void Setting::setConverter(std::shared_ptr<IConverter> value) { converter = std::move(value); }
 
 void Setting::onPropertyChanged(ParameterBits bits) {
-  if (interceptor != nullptr)
+  // Most settings have no observer; skip taking a subscriber then.
+  if (interceptor != nullptr && subject.has_observers())
     subject.get_subscriber().on_next(SettingChange{this, bits});
 }
 
@@ -99,7 +100,7 @@ void Setting::notifyValueChanged() {
   if (interceptor == nullptr)
     return;
   onPropertyChanged(ParameterBits::ValueChanged);
-  if (hasAny(parameterBits, ParameterBits::PublishChange))
+  if (hasAny(parameterBits, ParameterBits::PublishChange) && interceptor->getSubject().has_observers())
     interceptor->getSubject().get_subscriber().on_next(this);
 }
 

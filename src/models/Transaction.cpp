@@ -9,17 +9,6 @@
 
 namespace Corvane::Wavemill {
 
-Transaction::Transaction(Interceptor *interceptor, Setting *setting)
-    : Transaction(interceptor, setting, TransactionOption::NoCouple) {}
-
-Transaction::Transaction(Interceptor *interceptor, Setting *setting, TransactionOption option)
-    : interceptor(interceptor), setting(setting), option(option) {}
-
-Transaction::~Transaction() {
-  if (interceptor != nullptr && interceptor->getCurrentTransaction() == this)
-    interceptor->abandon(this);
-}
-
 Interceptor *Transaction::getInterceptor() const { return interceptor; }
 
 Setting *Transaction::getSetting() const {

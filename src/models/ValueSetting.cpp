@@ -1,5 +1,5 @@
-#include "wavemill/models/NumericSetting.h"
 #include "wavemill/models/ValueSetting.h"
+#include "wavemill/models/NumericSetting.h"
 
 namespace Corvane::Wavemill {
 

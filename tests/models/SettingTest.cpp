@@ -292,10 +292,24 @@ TEST(SettingTest, VisitCallsTheOverloadOfTheSettingsClass) {
   EXPECT_EQ(visitor.seen, "BiLDSSS");
 }
 
-TEST(SettingTest, ValidValuesAreCreatedOnFirstUseAndFilledByTheApplication) {
-  Int32Setting choice("Choice");
-  EXPECT_TRUE(choice.getValidInt32Values().empty());
+TEST(SettingTest, EnumSettingFillsItsValidValuesThroughTheList) {
+  // An enum setting as an application writes it: an Int32Setting subclass
+  // with EnumKind that fills the list the first read creates.
+  struct Waveform : Int32Setting {
+    Waveform() : Int32Setting("Waveform") {
+      setFlag(ParameterBits::EnumKind, true);
+      getValidInt32Values();
+      validValues->assign({0, 1, 4});
+    }
+    int findEnumIndex(const std::string &text) const override { return text == "Square" ? 1 : -1; }
+  };
+  Waveform waveform;
+  ISetting &setting = waveform;
+  EXPECT_TRUE(setting.isEnumSetting());
+  auto values = setting.getValidInt32Values();
+  ASSERT_EQ(values.size(), 3u);
+  EXPECT_EQ(values[2], 4);
+  EXPECT_EQ(setting.findEnumIndex("Square"), 1);
+  EXPECT_TRUE(Int32Setting("Plain").getValidInt32Values().empty());
   EXPECT_TRUE(BoolSetting("b").getValidInt32Values().empty());
-  choice.setFlag(ParameterBits::EnumKind, true);
-  EXPECT_TRUE(choice.isEnumSetting());
 }

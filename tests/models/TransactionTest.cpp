@@ -1,3 +1,4 @@
+#include "wavemill/models/Transaction.h"
 #include "wavemill/models/BoolSetting.h"
 #include "wavemill/models/Couplings.h"
 #include "wavemill/models/DoubleSetting.h"
@@ -6,7 +7,6 @@
 #include "wavemill/models/ModelBase.h"
 #include "wavemill/models/Prototype.h"
 #include "wavemill/models/StringSetting.h"
-#include "wavemill/models/Transaction.h"
 #include "wavemill/services/ServiceBase.h"
 
 #include <gtest/gtest.h>
@@ -45,9 +45,8 @@ struct Tree {
     root->events = &events;
     root->activateSettings(&interceptor, nullptr);
     for (const auto &setting : root->getAllSettings()) {
-      subscriptions.push_back(setting->getSubject().get_observable().subscribe([this](const SettingChange &change) {
-        events.push_back("setting:" + change.setting->getName());
-      }));
+      subscriptions.push_back(setting->getSubject().get_observable().subscribe(
+          [this](const SettingChange &change) { events.push_back("setting:" + change.setting->getName()); }));
     }
     subscriptions.push_back(interceptor.getSubject().get_observable().subscribe(
         [this](ISetting *setting) { events.push_back("tree:" + setting->getName()); }));
@@ -81,7 +80,8 @@ TEST(TransactionTest, AWriteNotifiesOwnerSettingAndTreeThenCouplesOnce) {
   });
 
   tree.root->frequency->setValue(1e6);
-  EXPECT_EQ(tree.events, (std::vector<std::string>{"owner:Frequency", "setting:Frequency", "tree:Frequency", "couple"}));
+  EXPECT_EQ(tree.events,
+            (std::vector<std::string>{"owner:Frequency", "setting:Frequency", "tree:Frequency", "couple"}));
   EXPECT_EQ(method, "");
   EXPECT_EQ(option, TransactionOption::Couple);
   EXPECT_EQ(started, tree.root->frequency.get());

@@ -49,7 +49,9 @@ constexpr ParameterBits operator&(ParameterBits a, ParameterBits b) {
 constexpr ParameterBits operator^(ParameterBits a, ParameterBits b) {
   return static_cast<ParameterBits>(static_cast<std::uint32_t>(a) ^ static_cast<std::uint32_t>(b));
 }
-constexpr ParameterBits operator~(ParameterBits a) { return static_cast<ParameterBits>(~static_cast<std::uint32_t>(a)); }
+constexpr ParameterBits operator~(ParameterBits a) {
+  return static_cast<ParameterBits>(~static_cast<std::uint32_t>(a));
+}
 
 /// True when any bit of `mask` is set in `bits`.
 constexpr bool hasAny(ParameterBits bits, ParameterBits mask) { return (bits & mask) != ParameterBits::None; }

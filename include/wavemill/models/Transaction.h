@@ -1,6 +1,7 @@
 #pragma once
 
 #include "wavemill/Export.h"
+#include "wavemill/models/Interceptor.h"
 #include "wavemill/models/TransactionOption.h"
 
 #include <memory>
@@ -10,7 +11,6 @@
 
 namespace Corvane::Wavemill {
 
-class Interceptor;
 class ModelBase;
 class Setting;
 
@@ -20,9 +20,14 @@ class Setting;
 /// several writes use a SyncTransaction.
 class WAVEMILL_API Transaction {
 public:
-  Transaction(Interceptor *interceptor, Setting *setting);
-  Transaction(Interceptor *interceptor, Setting *setting, TransactionOption option);
-  virtual ~Transaction();
+  Transaction(Interceptor *interceptor, Setting *setting)
+      : interceptor(interceptor), setting(setting), option(TransactionOption::NoCouple) {}
+  Transaction(Interceptor *interceptor, Setting *setting, TransactionOption option)
+      : interceptor(interceptor), setting(setting), option(option) {}
+  virtual ~Transaction() {
+    if (interceptor != nullptr && interceptor->getCurrentTransaction() == this)
+      interceptor->abandon(this);
+  }
 
   Transaction(const Transaction &) = delete;
   Transaction &operator=(const Transaction &) = delete;
@@ -36,8 +41,8 @@ public:
   /// already belongs to that tree (the loop guard). See PropagationOption.
   virtual std::shared_ptr<Transaction> propagate(ModelBase *model, PropagationOption propagation,
                                                  TransactionOption option);
-  virtual std::shared_ptr<Transaction> propagate(const std::shared_ptr<ModelBase> &model,
-                                                 PropagationOption propagation, TransactionOption option);
+  virtual std::shared_ptr<Transaction> propagate(const std::shared_ptr<ModelBase> &model, PropagationOption propagation,
+                                                 TransactionOption option);
   /// The name of the operation that runs; empty for a plain transaction.
   virtual std::string getMethodName() const;
   /// The i-th argument of the operation; null for a plain transaction.
