@@ -79,10 +79,96 @@ void roadOfAChange() {
   onLog.unsubscribe();
 }
 
+// An application: a signal generator whose coupling keeps period and
+// frequency consistent, with a list of markers.
+class Marker : public ModelBase {
+public:
+  WAVEMILL_MODEL(Marker)
+  Marker() : ModelBase("Demo::Marker") {}
+  std::shared_ptr<DoubleSetting> position = init(std::make_shared<DoubleSetting>("Position"));
+};
+
+class SignalGenerator : public ApplicationBase {
+public:
+  WAVEMILL_MODEL(SignalGenerator)
+  SignalGenerator() : ApplicationBase("Demo::SignalGenerator") {}
+
+  std::shared_ptr<DoubleSetting> frequency = init(std::make_shared<DoubleSetting>("Frequency", 1e6, 1.0, 6e9, 0.0));
+  std::shared_ptr<DoubleSetting> period = init(std::make_shared<DoubleSetting>("Period", 1e-6, 0.0, 1.0, 0.0));
+  std::shared_ptr<DoubleSetting> level = init(std::make_shared<DoubleSetting>("Level", -10.0, -130.0, 20.0, 0.0));
+  std::shared_ptr<BoolSetting> output = init(std::make_shared<BoolSetting>("Output"));
+  std::shared_ptr<SubSetting<ModelCollection<Marker>>> markers =
+      init(std::make_shared<SubSetting<ModelCollection<Marker>>>("Markers"));
+
+  void couple(Transaction *transaction) override {
+    ApplicationBase::couple(transaction);
+    if (transaction->getSetting() == frequency.get())
+      period->setValue(1.0 / frequency->getValue());
+  }
+};
+
+// A second application: a spectrum analyzer.
+class Analyzer : public ApplicationBase {
+public:
+  WAVEMILL_MODEL(Analyzer)
+  Analyzer() : ApplicationBase("Demo::Analyzer") {}
+  std::shared_ptr<DoubleSetting> span = init(std::make_shared<DoubleSetting>("Span", 1e6, 1.0, 1e9, 0.0));
+};
+
+void applications() {
+  section("Applications, selection and dirtiness");
+  auto manager = std::make_shared<ApplicationManager>();
+  Interceptor interceptor(manager);
+  manager->activateSettings(&interceptor, nullptr);
+  auto apps = manager->getApplications();
+
+  auto report = manager->transactions.get_observable().subscribe([apps](Transaction *transaction) {
+    std::string method = transaction->getMethodName();
+    std::cout << "  finished: " << (method.empty() ? transaction->getSetting()->getName() : method + "()");
+    for (const auto &app : apps->getItems())
+      std::cout << " | " << app->Name->getValue() << " selected=" << app->Selected->toString()
+                << " dirty=" << app->Dirty->toString();
+    std::cout << "\n";
+  });
+
+  auto generator = std::make_shared<SignalGenerator>();
+  generator->Name->setValue("Generator");
+  auto analyzer = std::make_shared<Analyzer>();
+  analyzer->Name->setValue("Analyzer");
+
+  std::cout << "open the generator (a lone application is selected)\n";
+  apps->add(generator);
+  std::cout << "open the analyzer\n";
+  apps->add(analyzer);
+  std::cout << "select the analyzer (selection is exclusive)\n";
+  analyzer->Selected->setValue(true);
+  std::cout << "set the generator's frequency to 10 MHz (the coupling sets the period)\n";
+  generator->frequency->setValue(10e6);
+  std::cout << "  -> period " << generator->period->toString()
+            << " s, key path of the generator: " << generator->makePath() << "\n";
+  std::cout << "add three markers, then remove the first\n";
+  auto markers = generator->markers->getValue();
+  for (int i = 0; i < 3; ++i) {
+    auto marker = markers->addItem();
+    marker->position->setValue(0.25 * (i + 1));
+  }
+  markers->removeAt(0);
+  std::cout << "  -> markers at keys";
+  for (const auto &marker : markers->getItems())
+    std::cout << " " << marker->getThisKey() << "=" << marker->position->toString();
+  std::cout << " (path of the last: " << markers->getItem(1)->makePath() << ")\n";
+  std::cout << "reset the generator (a reset clears Dirty)\n";
+  generator->reset();
+  std::cout << "  -> frequency " << generator->frequency->toString() << ", markers kept: " << markers->getCount()
+            << "\n";
+  report.unsubscribe();
+}
+
 } // namespace
 
 int main() {
   std::cout << "Wavemill demo\n";
   roadOfAChange();
+  applications();
   return 0;
 }

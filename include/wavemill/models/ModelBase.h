@@ -157,3 +157,25 @@ protected:
 WAVEMILL_API std::string makeFullKeyWithCardinality();
 
 } // namespace Corvane::Wavemill
+
+#include "wavemill/models/Prototype.h"
+#include "wavemill/models/RunTime.h"
+
+/// Inside the body of a model class `Class` (default-constructible, derived
+/// from ModelBase or one of its subclasses): the members every concrete
+/// model class overrides, namely its short and full type name (from the
+/// compiler's text of the class's own members, computed once), create() and
+/// getPrototype().
+///
+///   class Generator : public ApplicationBase {
+///   public:
+///     WAVEMILL_MODEL(Generator)
+///     Generator() : ApplicationBase("MyApp::Generator") {}
+///   };
+#define WAVEMILL_MODEL(Class)                                                                                          \
+  std::string getTypeName() const override { return WAVEMILL_TYPE_NAME(); }                                            \
+  std::string getFullTypeName() const override { return WAVEMILL_FULL_TYPE_NAME(); }                                   \
+  std::shared_ptr<::Corvane::Wavemill::IModel> create() const override { return std::make_shared<Class>(); }           \
+  std::shared_ptr<::Corvane::Wavemill::IModel> getPrototype() const override {                                         \
+    return ::Corvane::Wavemill::Prototype::getInstance<Class>();                                                       \
+  }
