@@ -99,15 +99,19 @@ std::shared_ptr<Transaction> ModelBase::doBeginEdit(const std::string &methodNam
   return std::make_shared<SyncTransaction>(interceptor, context.get(), methodName, nullptr);
 }
 
+// An inactive or nested model gets the shared empty transaction, whose option
+// must stay NoCouple for every other caller.
 std::shared_ptr<Transaction> ModelBase::beginRecall() {
   auto transaction = doBeginEdit("Recall");
-  transaction->setOption(TransactionOption::Recall);
+  if (transaction->getInterceptor() != nullptr)
+    transaction->setOption(TransactionOption::Recall);
   return transaction;
 }
 
 std::shared_ptr<Transaction> ModelBase::beginReset() {
   auto transaction = doBeginEdit("Reset");
-  transaction->setOption(TransactionOption::Reset);
+  if (transaction->getInterceptor() != nullptr)
+    transaction->setOption(TransactionOption::Reset);
   return transaction;
 }
 
