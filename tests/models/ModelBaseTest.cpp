@@ -3,18 +3,11 @@
 #include "wavemill/models/Couplings.h"
 #include "wavemill/models/DoubleSetting.h"
 #include "wavemill/models/Int32Setting.h"
-#include "wavemill/models/Interceptor.h"
-#include "wavemill/models/Metadata.h"
-#include "wavemill/models/Prototype.h"
-#include "wavemill/models/StringSetting.h"
 #include "wavemill/services/LogBase.h"
 
 #include <gtest/gtest.h>
 
 #include <functional>
-#include <memory>
-#include <string>
-#include <vector>
 
 using namespace Corvane::Wavemill;
 
@@ -23,7 +16,7 @@ namespace {
 // Runs a hook when it is bound, to look at its model at that moment.
 class HookSetting : public StringSetting {
 public:
-  explicit HookSetting(const char *name) : StringSetting(name) {}
+  using StringSetting::StringSetting;
   void activate(Interceptor *interceptor, IModel *owner) override {
     StringSetting::activate(interceptor, owner);
     if (hook)
@@ -34,23 +27,21 @@ public:
 
 class Oscillux : public ModelBase {
 public:
-  Oscillux() : ModelBase("Quartz::Oscillux") { dirty->setResettable(false); }
+  Oscillux() : ModelBase("Quartz::Oscillux") {}
   std::shared_ptr<IModel> create() const override { return std::make_shared<Oscillux>(); }
   std::shared_ptr<IModel> getPrototype() const override { return Prototype::getInstance<Oscillux>(); }
-  void initialize() override {
-    ++initializations;
-    ownedWhenInitialized = getOwner() != nullptr; // initialize runs before the owner is set
+  void initialize() override { ++initializations; }
+  void change() {
+    level->setValue(7.25);
+    label->setValue("busy");
   }
 
   std::shared_ptr<DoubleSetting> level = init(std::make_shared<DoubleSetting>("Level", 1.5, -10.0, 10.0, 0.0));
   std::shared_ptr<Int32Setting> taps = init(std::make_shared<Int32Setting>("Taps"));
-  std::shared_ptr<BoolSetting> armed = init(std::make_shared<BoolSetting>("Armed", true));
   std::shared_ptr<StringSetting> label = init(std::make_shared<StringSetting>("Label", "idle"));
-  std::shared_ptr<BoolSetting> dirty = init(std::make_shared<BoolSetting>("Dirty"));
   std::shared_ptr<Int32Setting> shadow = init(std::make_shared<Int32Setting>("Taps"));
   std::shared_ptr<HookSetting> probe = init(std::make_shared<HookSetting>("Probe"));
   int initializations = 0;
-  bool ownedWhenInitialized = false;
 };
 
 // Same settings as Oscillux, but another class.
@@ -61,8 +52,9 @@ public:
 };
 
 // An active root whose couplings count and record what they receive.
-struct ActiveOscillux {
-  ActiveOscillux() : model(std::make_shared<Oscillux>()), interceptor(model) {
+class ModelBaseTest : public testing::Test {
+protected:
+  ModelBaseTest() {
     model->activateSettings(&interceptor, nullptr);
     model->setCouplings(std::make_shared<Couplings>([this](ModelBase *, Transaction *transaction) {
       ++couples;
@@ -70,90 +62,69 @@ struct ActiveOscillux {
       option = transaction->getOption();
     }));
   }
-  std::shared_ptr<Oscillux> model;
-  Interceptor interceptor;
+  std::shared_ptr<Oscillux> model = std::make_shared<Oscillux>();
+  Interceptor interceptor{model};
   int couples = 0;
   std::string method;
   TransactionOption option = TransactionOption::NoCouple;
 };
 
-void change(Oscillux &model) {
-  model.level->setValue(7.25);
-  model.taps->setValue(12);
-  model.armed->setValue(false);
-  model.label->setValue("busy");
-  model.dirty->setValue(true);
-}
-
 } // namespace
 
-TEST(ModelBaseTest, ContextComesFirstAndTypeNameDropsNamespace) {
+TEST_F(ModelBaseTest, ContextComesFirstAndTypeNameDropsNamespace) {
   ModelBase plain("Foo::Bar");
   ASSERT_EQ(plain.getAllSettings().size(), 1u);
   EXPECT_EQ(plain.getAllSettings()[0]->getName(), "Context");
   EXPECT_EQ(plain.getTypeName(), "Bar");
   EXPECT_EQ(ModelBase("A::B::C").getTypeName(), "C");
   EXPECT_EQ(ModelBase("Flat").getTypeName(), "Flat");
-
-  Oscillux model;
-  EXPECT_EQ(model.getAllSettings()[0], model.getContext());
-  EXPECT_EQ(model.getAllSettings()[1], model.level);
+  EXPECT_EQ(model->getAllSettings()[0], model->getContext());
   // One full name serves every class that keeps the inherited form.
-  EXPECT_EQ(plain.getFullTypeName(), model.getFullTypeName());
+  EXPECT_EQ(plain.getFullTypeName(), model->getFullTypeName());
   EXPECT_EQ(plain.getFullTypeName().rfind("Models.", 0), 0u);
 }
 
-TEST(ModelBaseTest, GetSettingUsesOneMapPerClassAndFirstOfEqualNamesWins) {
-  Oscillux first;
-  Oscillux second;
-  EXPECT_EQ(first.getSetting("Level"), first.level);
-  EXPECT_EQ(second.getSetting("Label"), second.label);
-  EXPECT_EQ(first.getSetting("Taps"), first.taps);
-  EXPECT_EQ(first.getSetting("Context"), first.getContext());
-
-  auto map = Prototype::getInstance<Oscillux>()->getMetadata().get<ModelBase::SettingMap>("SettingMap");
-  ASSERT_NE(map, nullptr);
-  const auto size = map->size();
-  EXPECT_EQ(first.getSetting("Absent"), nullptr);
-  EXPECT_EQ(map->size(), size);
-  EXPECT_EQ(first.getMetadata().size(), 0u); // instances carry no map of their own
+TEST_F(ModelBaseTest, GetSettingUsesOneMapPerClassAndFirstOfEqualNamesWins) {
+  Oscillux other;
+  EXPECT_EQ(model->getSetting("Level"), model->level);
+  EXPECT_EQ(other.getSetting("Label"), other.label);
+  EXPECT_EQ(model->getSetting("Taps"), model->taps);
+  EXPECT_EQ(model->getSetting("Context"), model->getContext());
+  EXPECT_EQ(model->getSetting("Absent"), nullptr);
 }
 
-TEST(ModelBaseTest, ActivationBindsInOrderAndDeactivationIsTerminal) {
+TEST_F(ModelBaseTest, ActivationBindsInOrderAndDeactivationIsTerminal) {
   Oscillux parent;
-  Interceptor interceptor;
-  auto model = std::make_shared<Oscillux>();
+  auto child = std::make_shared<Oscillux>();
   bool ownerSetFirst = false;
-  model->probe->hook = [&] {
+  child->probe->hook = [&] {
     ownerSetFirst =
-        model->initializations == 1 && model->getOwner() == &parent && model->getInterceptor() == &interceptor;
-    model->init(std::make_shared<BoolSetting>("Late"));
+        child->initializations == 1 && child->getOwner() == &parent && child->getInterceptor() == &interceptor;
+    child->init(std::make_shared<BoolSetting>("Late"));
   };
-  model->activateSettings(nullptr, &parent);
-  EXPECT_EQ(model->getOwner(), nullptr);
-  model->setThisKey("Slot");
+  child->activateSettings(nullptr, &parent);
+  EXPECT_EQ(child->getOwner(), nullptr);
+  child->setThisKey("Slot");
 
-  model->activateSettings(&interceptor, &parent);
+  child->activateSettings(&interceptor, &parent);
   EXPECT_TRUE(ownerSetFirst);
-  EXPECT_FALSE(model->ownedWhenInitialized);
-  EXPECT_EQ(model->getAllSettings().back()->getInterceptor(), &interceptor); // appended during activation
-  EXPECT_EQ(model->level->getOwner(), model.get());
-  EXPECT_EQ(model->getThisKey(), "Slot");
+  EXPECT_EQ(child->getAllSettings().back()->getInterceptor(), &interceptor); // appended during activation
+  EXPECT_EQ(child->level->getOwner(), child.get());
+  EXPECT_EQ(child->getThisKey(), "Slot");
 
-  model->deactivateSettings();
-  EXPECT_TRUE(model->getAllSettings().empty());
-  EXPECT_EQ(model->level->getInterceptor(), nullptr);
-  EXPECT_EQ(model->getOwner(), nullptr);
-  model->setOwner(&parent);
-  EXPECT_EQ(model->getThisKey(), ""); // the stored key was cleared too
+  child->deactivateSettings();
+  EXPECT_TRUE(child->getAllSettings().empty());
+  EXPECT_EQ(child->level->getInterceptor(), nullptr);
+  EXPECT_EQ(child->getOwner(), nullptr);
+  child->setOwner(&parent);
+  EXPECT_EQ(child->getThisKey(), ""); // the stored key was cleared too
 
-  Oscillux inactive;
-  const auto before = inactive.getAllSettings();
-  inactive.deactivateSettings();
-  EXPECT_EQ(inactive.getAllSettings(), before);
+  const auto before = parent.getAllSettings();
+  parent.deactivateSettings(); // inactive: nothing to undo
+  EXPECT_EQ(parent.getAllSettings(), before);
 }
 
-TEST(ModelBaseTest, PathJoinsKeysBelowTheRoot) {
+TEST_F(ModelBaseTest, PathJoinsKeysBelowTheRoot) {
   ModelBase root("Root"), a("A"), gap("Gap"), b("B"), c("C"), lead("Lead"), d("D");
   root.setThisKey("Ignored");
   EXPECT_EQ(root.getThisKey(), "");
@@ -174,7 +145,7 @@ TEST(ModelBaseTest, PathJoinsKeysBelowTheRoot) {
   EXPECT_EQ(d.makePath(), "D");    // but no comma before any text
 }
 
-TEST(ModelBaseTest, AncestorCountsItselfFirstAndStopsOnLoopsWithWarning) {
+TEST_F(ModelBaseTest, AncestorCountsItselfFirstAndStopsOnLoopsWithWarning) {
   ModelBase top("Outer::Console"), mid("Inner::Panel"), leaf("Inner::Knob");
   mid.setOwner(&top);
   leaf.setOwner(&mid);
@@ -185,91 +156,77 @@ TEST(ModelBaseTest, AncestorCountsItselfFirstAndStopsOnLoopsWithWarning) {
   std::vector<std::pair<int, std::string>> warnings;
   auto subscription = LogBase::get("Log")->getSubject().get_observable().subscribe(
       [&](LogMessage *message) { warnings.emplace_back(message->level, message->text); });
-
   std::vector<std::unique_ptr<ModelBase>> chain;
-  for (int i = 0; i < 52; ++i)
+  for (int i = 0; i < 52; ++i) {
     chain.push_back(std::make_unique<ModelBase>(i == 50 ? "Fifty" : i == 51 ? "FiftyOne" : "Link"));
-  for (int i = 0; i + 1 < 52; ++i)
-    chain[i]->setOwner(chain[i + 1].get());
+    if (i > 0)
+      chain[i - 1]->setOwner(chain[i].get());
+  }
   EXPECT_EQ(chain[0]->ancestor("Fifty"), chain[50].get());
   EXPECT_TRUE(warnings.empty());
   EXPECT_EQ(chain[0]->ancestor("FiftyOne"), chain[0].get()); // too deep
-
-  ModelBase x("X"), y("Y");
-  x.setOwner(&y);
-  y.setOwner(&x);
-  EXPECT_EQ(x.ancestor("Missing"), &x);
+  mid.setOwner(&leaf);
+  EXPECT_EQ(leaf.ancestor("Missing"), &leaf); // a loop
   subscription.unsubscribe();
 
   const std::pair<int, std::string> warning{3, "There may be a loop or deep node in models."};
   EXPECT_EQ(warnings, (std::vector<std::pair<int, std::string>>{warning, warning}));
 }
 
-TEST(ModelBaseTest, ResetRestoresResettableSettingsUnderOneCoupling) {
+TEST_F(ModelBaseTest, ResetRestoresResettableSettingsUnderOneCoupling) {
   Oscillux inactive;
-  change(inactive);
+  inactive.change();
   inactive.reset();
   EXPECT_EQ(inactive.level->getValue(), 1.5);
   EXPECT_EQ(inactive.label->getValue(), "idle");
-  EXPECT_TRUE(inactive.dirty->getValue()); // not resettable
   // The shared empty transaction of an inactive reset keeps its option.
   EXPECT_EQ(Transaction::empty()->getOption(), TransactionOption::NoCouple);
 
-  ActiveOscillux tree;
-  change(*tree.model);
-  tree.couples = 0;
-  tree.model->reset();
-  EXPECT_EQ(tree.couples, 1);
-  EXPECT_EQ(tree.method, "Reset");
-  EXPECT_EQ(tree.option, TransactionOption::Reset);
-  EXPECT_EQ(tree.model->taps->getValue(), 0);
-  EXPECT_TRUE(tree.model->dirty->getValue());
+  model->change();
+  couples = 0;
+  model->reset();
+  EXPECT_EQ(couples, 1);
+  EXPECT_EQ(method, "Reset");
+  EXPECT_EQ(option, TransactionOption::Reset);
+  EXPECT_EQ(model->level->getValue(), 1.5);
 }
 
-TEST(ModelBaseTest, CopyFromTakesSameClassOnlyByPositionInOneEdit) {
-  ActiveOscillux tree;
+TEST_F(ModelBaseTest, CopyFromTakesSameClassOnlyByPositionInOneEdit) {
   auto source = std::make_shared<Oscillux>();
-  change(*source);
-  EXPECT_FALSE(tree.model->copyFrom(nullptr));
-  EXPECT_FALSE(tree.model->copyFrom(tree.model));
-  EXPECT_FALSE(tree.model->copyFrom(std::make_shared<OscilluxTwin>()));
-  EXPECT_FALSE(tree.model->copyFrom(std::make_shared<ModelBase>("Quartz::Oscillux")));
-  EXPECT_EQ(tree.couples, 0);
+  source->change();
+  EXPECT_FALSE(model->copyFrom(nullptr));
+  EXPECT_FALSE(model->copyFrom(model));
+  EXPECT_FALSE(model->copyFrom(std::make_shared<OscilluxTwin>())); // same layout, another class
+  EXPECT_EQ(couples, 0);
 
   int notified = 0;
-  auto subscription =
-      tree.model->level->getSubject().get_observable().subscribe([&](const SettingChange &) { ++notified; });
-  EXPECT_TRUE(tree.model->copyFrom(source));
+  auto subscription = model->level->getSubject().get_observable().subscribe([&](const SettingChange &) { ++notified; });
+  EXPECT_TRUE(model->copyFrom(source));
   subscription.unsubscribe();
-  EXPECT_EQ(tree.couples, 1);
-  EXPECT_EQ(tree.option, TransactionOption::Couple);
+  EXPECT_EQ(couples, 1);
+  EXPECT_EQ(option, TransactionOption::Couple);
   EXPECT_EQ(notified, 0);
-  EXPECT_EQ(tree.model->level->getValue(), 7.25);
-  EXPECT_TRUE(tree.model->equals(source));
+  EXPECT_EQ(model->level->getValue(), 7.25);
+  EXPECT_TRUE(model->equals(source));
 }
 
-TEST(ModelBaseTest, DuplicateIsAnInactiveCopyAndEqualsNeedsTheSameClass) {
+TEST_F(ModelBaseTest, DuplicateIsAnInactiveCopyAndEqualsNeedsTheSameClass) {
   Oscillux parent;
-  ActiveOscillux tree;
-  tree.model->setOwner(&parent);
-  tree.model->setThisKey("Slot");
-  tree.model->getMetadata().setText("Note", "only here");
-  change(*tree.model);
+  model->setOwner(&parent);
+  model->setThisKey("Slot");
+  model->getMetadata().setText("Note", "only here");
+  model->change();
 
-  auto copy = std::dynamic_pointer_cast<Oscillux>(tree.model->duplicate());
+  auto copy = std::dynamic_pointer_cast<Oscillux>(model->duplicate());
   ASSERT_NE(copy, nullptr);
   EXPECT_EQ(copy->getOwner(), nullptr);
   EXPECT_EQ(copy->getInterceptor(), nullptr);
   copy->setOwner(&parent);
   EXPECT_EQ(copy->getThisKey(), "");
   EXPECT_EQ(copy->level->getValue(), 7.25);
-  EXPECT_TRUE(copy->equals(tree.model)); // keys and metadata do not count
-  EXPECT_TRUE(tree.model->equals(copy));
-
+  EXPECT_TRUE(copy->equals(model)); // keys and metadata do not count
   copy->taps->setValue(99);
-  EXPECT_FALSE(copy->equals(tree.model));
-  EXPECT_FALSE(tree.model->equals(copy));
-
+  EXPECT_FALSE(model->equals(copy));
   EXPECT_FALSE(copy->equals(nullptr));
   EXPECT_TRUE(copy->equals(copy));
   EXPECT_FALSE(std::make_shared<Oscillux>()->equals(std::make_shared<OscilluxTwin>()));
@@ -282,15 +239,14 @@ TEST(MetadataTest, TextAndTypedEntriesReplaceRatherThanMisread) {
   metadata.setText("Name", "second");
   EXPECT_EQ(metadata.getText("Name"), "second");
 
-  auto list = metadata.getOrCreate<std::vector<std::string>>("MissingSettings");
+  using List = std::vector<std::string>;
+  auto list = metadata.getOrCreate<List>("MissingSettings");
   list->push_back("Gain");
-  EXPECT_EQ(metadata.getOrCreate<std::vector<std::string>>("MissingSettings"), list);
-
-  auto replaced = metadata.getOrCreate<std::vector<std::string>>("Name");
+  EXPECT_EQ(metadata.getOrCreate<List>("MissingSettings"), list);
+  auto replaced = metadata.getOrCreate<List>("Name");
   ASSERT_NE(replaced, nullptr);
   EXPECT_TRUE(replaced->empty());
   EXPECT_EQ(metadata.getText("Name"), ""); // the text is gone, not reread as a list
-
-  metadata.set<std::vector<std::string>>("Null", nullptr);
-  EXPECT_NE(metadata.getOrCreate<std::vector<std::string>>("Null"), nullptr);
+  metadata.set<List>("Null", nullptr);
+  EXPECT_NE(metadata.getOrCreate<List>("Null"), nullptr);
 }

@@ -1,49 +1,28 @@
 #include "wavemill/models/ModelCollection.h"
 #include "wavemill/models/Couplings.h"
-#include "wavemill/models/DoubleSetting.h"
-#include "wavemill/models/Int32Setting.h"
-#include "wavemill/models/Interceptor.h"
-#include "wavemill/models/StringSetting.h"
-#include "wavemill/models/SubSetting.h"
 
 #include <gtest/gtest.h>
-
-#include <memory>
-#include <string>
-#include <vector>
 
 using namespace Corvane::Wavemill;
 
 namespace CollectionTests {
 
 // Items of a list with a fixed layout of different classes.
-class CollPart : public ModelBase {
-public:
+struct CollPart : ModelBase {
   WAVEMILL_MODEL(CollPart)
   CollPart() : ModelBase("Tests::CollPart") {}
   std::shared_ptr<Int32Setting> level = init(std::make_shared<Int32Setting>("Level"));
 };
-
-class CollPartA : public CollPart {
-public:
+struct CollPartA : CollPart {
   WAVEMILL_MODEL(CollPartA)
 };
-
-class CollPartB : public CollPart {
-public:
+struct CollPartB : CollPart {
   WAVEMILL_MODEL(CollPartB)
 };
-
-} // namespace CollectionTests
-
-using namespace CollectionTests;
 using Parts = ModelCollection<CollPart>;
 
-namespace {
-
 // A root holding a list of parts and a list of lists.
-class CollRoot : public ModelBase {
-public:
+struct CollRoot : ModelBase {
   WAVEMILL_MODEL(CollRoot)
   CollRoot() : ModelBase("Tests::CollRoot") {}
   std::shared_ptr<SubSetting<Parts>> parts = init(std::make_shared<SubSetting<Parts>>("Parts"));
@@ -51,33 +30,16 @@ public:
       init(std::make_shared<SubSetting<ModelCollection<Parts>>>("Nested"));
 };
 
-// An active tree whose couplings record each transaction's method, first
-// argument and the list's count at that moment.
-struct Tree {
-  Tree() : root(std::make_shared<CollRoot>()), interceptor(root) {
-    root->activateSettings(&interceptor, nullptr);
-    root->setCouplings(std::make_shared<Couplings>([this](ModelBase *, Transaction *t) {
-      auto argument = t->getSettingAt(0);
-      calls.push_back(t->getMethodName() + "(" + (argument ? argument->toString() : "") + ")#" +
-                      std::to_string(parts()->getCount()));
-    }));
-  }
-  std::shared_ptr<Parts> parts() const { return root->parts->getValue(); }
-  std::vector<std::string> keys() const {
-    std::vector<std::string> result;
-    for (const auto &item : parts()->getItems())
-      result.push_back(item->getThisKey());
-    return result;
-  }
-
-  std::shared_ptr<CollRoot> root;
-  Interceptor interceptor;
-  std::vector<std::string> calls;
-};
-
-template <class T> std::shared_ptr<T> part(int level) {
+template <class T = CollPart> std::shared_ptr<T> part(int level) {
   auto made = std::make_shared<T>();
   made->level->setValue(level);
+  return made;
+}
+
+std::shared_ptr<Parts> list(std::initializer_list<std::shared_ptr<CollPart>> items) {
+  auto made = std::make_shared<Parts>();
+  for (const auto &item : items)
+    made->add(item);
   return made;
 }
 
@@ -88,166 +50,166 @@ std::vector<int> levels(const Parts &list) {
   return result;
 }
 
-} // namespace
+// An active tree whose couplings record each transaction's method, first
+// argument and the list's count at that moment.
+class ModelCollectionTest : public testing::Test {
+protected:
+  ModelCollectionTest() {
+    root->activateSettings(&interceptor, nullptr);
+    root->setCouplings(std::make_shared<Couplings>([this](ModelBase *, Transaction *t) {
+      auto argument = t->getSettingAt(0);
+      calls.push_back(t->getMethodName() + "(" + (argument ? argument->toString() : "") + ")#" +
+                      std::to_string(parts->getCount()));
+    }));
+  }
+  void expectKeysEqualIndices() {
+    for (int i = 0; i < parts->getCount(); ++i)
+      EXPECT_EQ(parts->getItem(i)->getThisKey(), std::to_string(i));
+  }
+  std::shared_ptr<CollRoot> root = std::make_shared<CollRoot>();
+  Interceptor interceptor{root};
+  std::shared_ptr<Parts> parts = root->parts->getValue();
+  std::vector<std::string> calls;
+};
 
-TEST(ModelCollectionTest, ShapeChangesRunNamedTransactionsAndKeepKeysEqualToIndices) {
-  Tree tree;
-  auto list = tree.parts();
-  list->add();
-  list->add(part<CollPartA>(1));
-  list->add();
-  EXPECT_EQ(list->add(std::make_shared<CollRoot>()), nullptr); // not a part: refused without an edit
-  EXPECT_EQ(tree.calls, (std::vector<std::string>{"add()#1", "add(CollPartA)#2", "add()#3"}));
-  EXPECT_EQ(tree.keys(), (std::vector<std::string>{"0", "1", "2"}));
-  EXPECT_EQ(list->getItem(1)->makePath(), "Parts,1");
-  EXPECT_EQ(list->getItem(1)->getInterceptor(), &tree.interceptor);
+} // namespace CollectionTests
 
-  tree.calls.clear();
-  auto first = list->getItem(0);
-  list->removeAt(0);
-  EXPECT_EQ(tree.keys(), (std::vector<std::string>{"0", "1"}));
+using namespace CollectionTests;
+
+TEST_F(ModelCollectionTest, ShapeChangesRunNamedTransactionsAndKeepKeysEqualToIndices) {
+  parts->add();
+  parts->add(part<CollPartA>(1));
+  parts->add();
+  EXPECT_EQ(parts->add(std::make_shared<CollRoot>()), nullptr); // not a part: refused without an edit
+  EXPECT_EQ(calls, (std::vector<std::string>{"add()#1", "add(CollPartA)#2", "add()#3"}));
+  expectKeysEqualIndices();
+  EXPECT_EQ(parts->getItem(1)->makePath(), "Parts,1");
+  EXPECT_EQ(parts->getItem(1)->getInterceptor(), &interceptor);
+
+  calls.clear();
+  auto first = parts->getItem(0);
+  parts->removeAt(0);
+  expectKeysEqualIndices();
   EXPECT_TRUE(first->getAllSettings().empty()); // a removed item is spent
-  list->removeAt(-1);
-  list->removeAt(2);
-  EXPECT_EQ(list->getCount(), 2);
-  EXPECT_EQ(tree.calls, (std::vector<std::string>{"removeAt(0)#2", "removeAt(-1)#2", "removeAt(2)#2"}));
+  parts->removeAt(-1);
+  parts->removeAt(2);
+  EXPECT_EQ(parts->getCount(), 2);
+  EXPECT_EQ(calls, (std::vector<std::string>{"removeAt(0)#2", "removeAt(-1)#2", "removeAt(2)#2"}));
 
-  tree.calls.clear();
-  list->resize(4);
-  list->resize(-1);
-  list->resize(1);
-  EXPECT_EQ(tree.calls, (std::vector<std::string>{"resize(4)#4", "resize(1)#1"}));
-  EXPECT_EQ(levels(*list), std::vector<int>{1});
+  calls.clear();
+  parts->resize(4);
+  parts->resize(-1);
+  parts->resize(1);
+  EXPECT_EQ(calls, (std::vector<std::string>{"resize(4)#4", "resize(1)#1"}));
+  EXPECT_EQ(levels(*parts), std::vector<int>{1});
 
-  tree.calls.clear();
+  calls.clear();
   auto replacement = part<CollPartB>(7);
-  auto old = list->getItem(0);
-  list->setItem(0, replacement);
-  list->setItem(1, part<CollPartB>(8)); // outside the list
-  list->setItem(0, nullptr);
+  auto old = parts->getItem(0);
+  parts->setItem(0, replacement);
+  parts->setItem(1, part<CollPartB>(8)); // outside the list
+  parts->setItem(0, nullptr);
   EXPECT_TRUE(old->getAllSettings().empty());
   EXPECT_EQ(replacement->getThisKey(), "0");
-  EXPECT_EQ(replacement->getInterceptor(), &tree.interceptor);
-
-  list->clear(); // the coupling sees the old count
-  EXPECT_EQ(tree.calls, (std::vector<std::string>{"setItem()#1", "clear()#1"}));
-  EXPECT_EQ(list->getCount(), 0);
-  EXPECT_EQ(list->getCommonItem(0), nullptr);
+  EXPECT_EQ(replacement->getInterceptor(), &interceptor);
+  parts->clear(); // the coupling sees the old count
+  EXPECT_EQ(calls, (std::vector<std::string>{"setItem()#1", "clear()#1"}));
+  EXPECT_EQ(parts->getCount(), 0);
+  EXPECT_EQ(parts->getCommonItem(0), nullptr);
 }
 
-TEST(ModelCollectionTest, InactiveCollectionChangesWithoutTransactionsOrBinding) {
-  Parts list;
-  auto item = std::static_pointer_cast<CollPart>(list.add());
-  list.resize(3);
-  EXPECT_EQ(list.getCount(), 3);
-  EXPECT_EQ(item->getInterceptor(), nullptr);
+TEST_F(ModelCollectionTest, InactiveCollectionChangesWithoutTransactionsOrBindingAndHasNoCouplings) {
+  Parts inactive;
+  auto item = inactive.add();
+  inactive.resize(3);
+  EXPECT_EQ(inactive.getCount(), 3);
   EXPECT_EQ(item->getThisKey(), ""); // no owner: no key
-  list.clear();
-  EXPECT_EQ(list.getCount(), 0);
-  list.setCouplings(std::make_shared<Couplings>());
-  EXPECT_EQ(list.getCouplings(), nullptr);
-  EXPECT_TRUE(list.isCollection());
-  EXPECT_EQ(list.getItemPrototype(), Prototype::getInstance<CollPart>());
+  EXPECT_EQ(std::static_pointer_cast<CollPart>(item)->getInterceptor(), nullptr);
+  inactive.clear();
+  EXPECT_EQ(inactive.getCount(), 0);
+  inactive.setCouplings(std::make_shared<Couplings>());
+  EXPECT_EQ(inactive.getCouplings(), nullptr);
 }
 
-TEST(ModelCollectionTest, TypeNamesWrapTheItemClassNames) {
-  Parts list;
-  EXPECT_EQ(list.getTypeName(), "ModelCollection`1[[CollPart]]");
-  EXPECT_EQ(list.getFullTypeName(), "Models.ModelCollection`1[[CollectionTests.CollPart]]");
-  EXPECT_EQ(list.toString(), list.getTypeName());
+TEST_F(ModelCollectionTest, TypeNamesWrapTheItemClassNames) {
+  EXPECT_EQ(parts->getTypeName(), "ModelCollection`1[[CollPart]]");
+  EXPECT_EQ(parts->getFullTypeName(), "Models.ModelCollection`1[[CollectionTests.CollPart]]");
+  EXPECT_EQ(parts->toString(), parts->getTypeName());
   EXPECT_EQ(ModelCollection<Parts>().getTypeName(), "ModelCollection`1[[ModelCollection`1[[CollPart]]]]");
 }
 
-TEST(ModelCollectionTest, CopyOverwriteFollowsTheSourceButKeepsMismatchingSlots) {
-  Parts source, target;
-  source.add(part<CollPartA>(1));
-  source.add(part<CollPartB>(2));
-  source.add(part<CollPartA>(3));
-  target.add(part<CollPartA>(10));
-  target.add(part<CollPartA>(20)); // class differs from the source's B: keeps its data
-
-  EXPECT_TRUE(target.copyFrom(std::shared_ptr<IModel>(&source, [](IModel *) {})));
-  EXPECT_EQ(levels(target), (std::vector<int>{1, 20, 3}));
-  EXPECT_EQ(target.getItem(2)->getTypeName(), "CollPartA");
-
-  Parts shorter;
-  shorter.add(part<CollPartA>(5));
-  EXPECT_TRUE(target.copyFrom(std::shared_ptr<IModel>(&shorter, [](IModel *) {})));
-  EXPECT_EQ(levels(target), std::vector<int>{5});
+TEST_F(ModelCollectionTest, CopyOverwriteFollowsTheSourceButKeepsMismatchingSlots) {
+  // The second item's class differs from the source's B: it keeps its data.
+  auto target = list({part<CollPartA>(10), part<CollPartA>(20)});
+  EXPECT_TRUE(target->copyFrom(list({part<CollPartA>(1), part<CollPartB>(2), part<CollPartA>(3)})));
+  EXPECT_EQ(levels(*target), (std::vector<int>{1, 20, 3}));
+  EXPECT_EQ(target->getItem(2)->getTypeName(), "CollPartA");
+  EXPECT_TRUE(target->copyFrom(list({part<CollPartA>(5)})));
+  EXPECT_EQ(levels(*target), std::vector<int>{5});
 
   // A fixed count neither grows nor shrinks the list.
-  Parts fixed, five;
-  fixed.setFixedCount(true);
-  fixed.add(part<CollPartA>(0));
-  fixed.add(part<CollPartA>(0));
-  for (int i = 1; i <= 5; ++i)
-    five.add(part<CollPartA>(i));
-  EXPECT_TRUE(fixed.copyFrom(std::shared_ptr<IModel>(&five, [](IModel *) {})));
-  EXPECT_EQ(levels(fixed), (std::vector<int>{1, 2}));
+  auto fixed = list({part(0), part(0)});
+  fixed->setFixedCount(true);
+  EXPECT_TRUE(fixed->copyFrom(list({part(1), part(2), part(3), part(4), part(5)})));
+  EXPECT_EQ(levels(*fixed), (std::vector<int>{1, 2}));
 
-  EXPECT_FALSE(target.copyFrom(nullptr));
-  EXPECT_FALSE(target.copyFrom(std::shared_ptr<IModel>(&target, [](IModel *) {})));
-  EXPECT_FALSE(target.copyFrom(std::make_shared<ModelCollection<CollPartA>>()));
+  EXPECT_FALSE(target->copyFrom(nullptr));
+  EXPECT_FALSE(target->copyFrom(target));
+  EXPECT_FALSE(target->copyFrom(std::make_shared<ModelCollection<CollPartA>>()));
 }
 
-TEST(ModelCollectionTest, CopyExistingOnlyPairsItemsByClass) {
-  auto copy = [](const std::vector<std::shared_ptr<CollPart>> &from, const std::vector<std::shared_ptr<CollPart>> &to) {
-    Parts source, target;
-    for (const auto &item : from)
-      source.add(item);
-    for (const auto &item : to)
-      target.add(item);
-    target.setCopyExistingOnly(true);
-    target.copyFrom(std::shared_ptr<IModel>(&source, [](IModel *) {}));
-    return levels(target);
+TEST_F(ModelCollectionTest, CopyExistingOnlyPairsItemsByClass) {
+  auto copy = [](std::shared_ptr<Parts> from, std::shared_ptr<Parts> to) {
+    to->setCopyExistingOnly(true);
+    to->copyFrom(from);
+    return levels(*to);
   };
   // [A, B] into [B, A]: each takes data of its own class.
-  EXPECT_EQ(copy({part<CollPartA>(1), part<CollPartB>(2)}, {part<CollPartB>(0), part<CollPartA>(0)}),
+  EXPECT_EQ(copy(list({part<CollPartA>(1), part<CollPartB>(2)}), list({part<CollPartB>(0), part<CollPartA>(0)})),
             (std::vector<int>{2, 1}));
   // [A] into [A, A, A]: item 0 pairs by position; the others find nothing left.
-  EXPECT_EQ(copy({part<CollPartA>(1)}, {part<CollPartA>(0), part<CollPartA>(0), part<CollPartA>(0)}),
+  EXPECT_EQ(copy(list({part<CollPartA>(1)}), list({part<CollPartA>(0), part<CollPartA>(0), part<CollPartA>(0)})),
             (std::vector<int>{1, 0, 0}));
   // [A1, A2, B1] into [B0, A0]: position 1 pairs A0 with A2, B0 takes B1, A1 stays unused.
-  EXPECT_EQ(
-      copy({part<CollPartA>(1), part<CollPartA>(2), part<CollPartB>(11)}, {part<CollPartB>(0), part<CollPartA>(0)}),
-      (std::vector<int>{11, 2}));
+  EXPECT_EQ(copy(list({part<CollPartA>(1), part<CollPartA>(2), part<CollPartB>(11)}),
+                 list({part<CollPartB>(0), part<CollPartA>(0)})),
+            (std::vector<int>{11, 2}));
   // An unpaired item takes every unused source item of its class: the last one wins.
-  EXPECT_EQ(copy({part<CollPartB>(1), part<CollPartA>(2), part<CollPartA>(3)}, {part<CollPartA>(0)}),
+  EXPECT_EQ(copy(list({part<CollPartB>(1), part<CollPartA>(2), part<CollPartA>(3)}), list({part<CollPartA>(0)})),
             std::vector<int>{3});
 }
 
-TEST(ModelCollectionTest, NestedCollectionsActivateAndCopyAsOneTree) {
-  Tree tree;
-  auto lists = tree.root->nested->getValue();
+TEST_F(ModelCollectionTest, NestedCollectionsActivateCopyAndResetAsOneTree) {
+  auto lists = root->nested->getValue();
   auto inner = std::static_pointer_cast<Parts>(lists->add());
   inner->add(part<CollPartA>(4));
   EXPECT_EQ(inner->getItem(0)->makePath(), "Nested,0,0");
   EXPECT_EQ(lists->getThisKey(), "Nested");
 
-  auto copy = std::static_pointer_cast<CollRoot>(tree.root->duplicate());
+  auto copy = std::static_pointer_cast<CollRoot>(root->duplicate());
   ASSERT_EQ(copy->nested->getValue()->getCount(), 1);
   auto copiedInner = copy->nested->getValue()->getItem(0);
   EXPECT_EQ(levels(*copiedInner), std::vector<int>{4});
-  EXPECT_TRUE(copy->equals(tree.root));
+  EXPECT_TRUE(copy->equals(root));
   copiedInner->getItem(0)->level->setValue(5);
-  EXPECT_FALSE(copy->equals(tree.root));
+  EXPECT_FALSE(copy->equals(root));
 
   // Reset descends into every item and keeps the counts.
   inner->getItem(0)->level->setValue(9);
-  tree.calls.clear();
-  tree.root->reset();
+  calls.clear();
+  root->reset();
   EXPECT_EQ(inner->getItem(0)->level->getValue(), 0);
   EXPECT_EQ(lists->getCount(), 1);
-  EXPECT_EQ(tree.calls, std::vector<std::string>{"Reset()#0"}); // one coupling for the whole tree
+  EXPECT_EQ(calls, std::vector<std::string>{"Reset()#0"}); // one coupling for the whole tree
 }
 
-TEST(ModelCollectionTest, CouplingHandsTheChangeToEveryItem) {
-  Parts list;
+TEST_F(ModelCollectionTest, CouplingHandsTheChangeToEveryItem) {
   int coupled = 0;
   auto counting = std::make_shared<Couplings>([&](ModelBase *, Transaction *) { ++coupled; });
-  for (int i = 0; i < 3; ++i)
-    std::static_pointer_cast<CollPart>(list.add())->setCouplings(counting);
+  auto items = list({part(0), part(0), part(0)});
+  for (const auto &item : items->getItems())
+    item->setCouplings(counting);
   Transaction transaction(nullptr, nullptr);
-  list.couple(&transaction);
+  items->couple(&transaction);
   EXPECT_EQ(coupled, 3);
 }

@@ -4,10 +4,8 @@
 
 #include <array>
 #include <atomic>
-#include <memory>
 #include <thread>
 #include <utility>
-#include <vector>
 
 using Corvane::Wavemill::Prototype;
 
@@ -17,13 +15,11 @@ template <int Tag> struct Counted {
   Counted() { made.fetch_add(1); }
   static inline std::atomic<int> made{0};
 };
-
 using Shared = Counted<-1>;
 using Dependency = Counted<-2>;
-
 struct Dependent {
-  Dependent() : dependency(Prototype::getInstance<Dependency>()) { made.fetch_add(1); }
-  std::shared_ptr<Dependency> dependency;
+  Dependent() { made.fetch_add(1); }
+  std::shared_ptr<Dependency> dependency = Prototype::getInstance<Dependency>();
   static inline std::atomic<int> made{0};
 };
 
@@ -38,13 +34,12 @@ template <std::size_t... Tags> auto ownClassGetters(std::index_sequence<Tags...>
 
 TEST(PrototypeConcurrencyTest, ThreadsReachingNewClassesAtOnceShareOneInstance) {
   // Every thread first reaches a class of its own, so that the shared map is
-  // filled from several threads at the same time.
+  // filled from several threads at the same time; half the threads then come
+  // through the class that needs the other one.
   const auto reachOwnClass = ownClassGetters(std::make_index_sequence<threadCount>());
   std::atomic<bool> go{false};
-  std::vector<std::shared_ptr<void>> own(threadCount);
-  std::vector<std::shared_ptr<Shared>> shared(threadCount);
-  std::vector<std::shared_ptr<Dependent>> dependents(threadCount);
-  std::vector<std::shared_ptr<Dependency>> dependencies(threadCount);
+  std::vector<std::shared_ptr<void>> own(threadCount), shared(threadCount), dependents(threadCount),
+      dependencies(threadCount);
   std::vector<std::thread> threads;
   for (int i = 0; i < threadCount; ++i)
     threads.emplace_back([&, i] {
@@ -52,14 +47,10 @@ TEST(PrototypeConcurrencyTest, ThreadsReachingNewClassesAtOnceShareOneInstance) 
         std::this_thread::yield();
       own[i] = reachOwnClass[i]();
       shared[i] = Prototype::getInstance<Shared>();
-      // Half the threads come through the class that needs the other one.
-      if (i % 2 == 0) {
+      if (i % 2 == 0)
         dependents[i] = Prototype::getInstance<Dependent>();
-        dependencies[i] = Prototype::getInstance<Dependency>();
-      } else {
-        dependencies[i] = Prototype::getInstance<Dependency>();
-        dependents[i] = Prototype::getInstance<Dependent>();
-      }
+      dependencies[i] = Prototype::getInstance<Dependency>();
+      dependents[i] = Prototype::getInstance<Dependent>();
     });
   go.store(true);
   for (auto &thread : threads)
@@ -75,7 +66,7 @@ TEST(PrototypeConcurrencyTest, ThreadsReachingNewClassesAtOnceShareOneInstance) 
     EXPECT_EQ(dependents[i], dependents[0]);
     EXPECT_EQ(dependencies[i], dependencies[0]);
   }
-  EXPECT_EQ(dependents[0]->dependency, dependencies[0]);
+  EXPECT_EQ(std::static_pointer_cast<Dependent>(dependents[0])->dependency, dependencies[0]);
   EXPECT_EQ(Shared::made.load(), 1);
   EXPECT_EQ(Dependent::made.load(), 1);
   EXPECT_EQ(Dependency::made.load(), 1);

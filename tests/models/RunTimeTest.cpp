@@ -6,21 +6,6 @@
 
 using Corvane::Wavemill::RunTime;
 
-namespace {
-
-const std::string resultPrefix =
-    "class std::basic_string<char,struct std::char_traits<char>,class std::allocator<char> > __cdecl ";
-
-std::string fullName(const std::string &signature) {
-  return RunTime::doGetFullTypeName(signature.c_str(), static_cast<int>(signature.size()) + 1);
-}
-
-std::string shortName(const std::string &signature) {
-  return RunTime::doGetTypeName(signature.c_str(), static_cast<int>(signature.size()) + 1);
-}
-
-} // namespace
-
 // Small classes that name themselves the way the model classes do; the names
 // are unusual so that they cannot meet a real class of the test program.
 struct RunTimeProbePlain {
@@ -30,23 +15,20 @@ struct RunTimeProbePlain {
 
 namespace Corvane::Wavemill {
 
-class RunTimeProbeBase {
-public:
+struct RunTimeProbeBase {
   virtual ~RunTimeProbeBase() = default;
   virtual const std::string &getTypeName() const = 0;
   virtual std::string getFullTypeName() const = 0;
 };
 
-class RunTimeProbeModel : public RunTimeProbeBase {
-public:
+struct RunTimeProbeModel : RunTimeProbeBase {
   const std::string &getTypeName() const override { return WAVEMILL_TYPE_NAME(); }
   std::string getFullTypeName() const override { return WAVEMILL_FULL_TYPE_NAME(); }
 };
 
 struct RunTimeProbePair {};
 
-template <class T> class RunTimeProbeCollection : public RunTimeProbeBase {
-public:
+template <class T> struct RunTimeProbeCollection : RunTimeProbeBase {
   const std::string &getTypeName() const override { return WAVEMILL_TYPE_NAME(); }
   virtual std::string getFullTypeName() const override { return WAVEMILL_FULL_TYPE_NAME(); }
 };
@@ -60,30 +42,25 @@ struct RunTimeProbeInner {
 } // namespace Corvane::Wavemill
 
 TEST(RunTimeTest, MicrosoftSignaturesGiveFullAndShortNames) {
-  const auto textModel = resultPrefix + "Corvane::Wavemill::TextModel::getFullTypeName(void) const";
-  EXPECT_EQ(fullName(textModel), "Corvane.Wavemill.TextModel");
-  EXPECT_EQ(shortName(textModel), "TextModel");
-
-  const auto collection =
-      resultPrefix +
-      "Corvane::Wavemill::ModelCollection<class Corvane::Wavemill::TextPair>::getFullTypeName(void) const";
-  EXPECT_EQ(fullName(collection), "Corvane::Wavemill::ModelCollection`1[[Corvane::Wavemill::TextPair]]");
-  EXPECT_EQ(shortName(collection), "ModelCollection`1[[TextPair]]");
-
-  const auto box = resultPrefix + "Corvane::Wavemill::Box<int>::getFullTypeName(void) const";
-  EXPECT_EQ(fullName(box), "Corvane::Wavemill::Box`1[[int]]");
-  EXPECT_EQ(shortName(box), "Box`1[[int]]");
-
-  const auto plain = resultPrefix + "Plain::getFullTypeName(void) const";
-  EXPECT_EQ(fullName(plain), "Plain");
-  EXPECT_EQ(shortName(plain), "Plain");
-}
-
-TEST(RunTimeTest, NestedTemplateArgumentKeepsItsKnownOddNames) {
-  // The nearest "<" is the inner one, so the outer class is not recognised.
-  const auto nested = resultPrefix + "ModelCollection<class ModelCollection<class Foo> >::getFullTypeName(void) const";
-  EXPECT_EQ(shortName(nested), "ModelCollection`1[[Foo> ]]");
-  EXPECT_EQ(fullName(nested), ">");
+  const std::string result =
+      "class std::basic_string<char,struct std::char_traits<char>,class std::allocator<char> > __cdecl ";
+  // Member text behind the result type, full name, short name.
+  const std::string cases[][3] = {
+      {"Corvane::Wavemill::TextModel::getFullTypeName(void) const", "Corvane.Wavemill.TextModel", "TextModel"},
+      {"Corvane::Wavemill::ModelCollection<class Corvane::Wavemill::TextPair>::getFullTypeName(void) const",
+       "Corvane::Wavemill::ModelCollection`1[[Corvane::Wavemill::TextPair]]", "ModelCollection`1[[TextPair]]"},
+      {"Corvane::Wavemill::Box<int>::getFullTypeName(void) const", "Corvane::Wavemill::Box`1[[int]]", "Box`1[[int]]"},
+      {"Plain::getFullTypeName(void) const", "Plain", "Plain"},
+      // The nearest "<" is the inner one, so the outer class is not recognised.
+      {"ModelCollection<class ModelCollection<class Foo> >::getFullTypeName(void) const", ">",
+       "ModelCollection`1[[Foo> ]]"},
+  };
+  for (const auto &[member, full, brief] : cases) {
+    const auto signature = result + member;
+    const int size = static_cast<int>(signature.size()) + 1;
+    EXPECT_EQ(RunTime::doGetFullTypeName(signature.c_str(), size), full) << member;
+    EXPECT_EQ(RunTime::doGetTypeName(signature.c_str(), size), brief) << member;
+  }
 }
 
 TEST(RunTimeTest, TextWithoutClassGivesEmptyNames) {
@@ -94,9 +71,8 @@ TEST(RunTimeTest, TextWithoutClassGivesEmptyNames) {
   EXPECT_EQ(RunTime::fullTypeNameOf(""), "");
   EXPECT_EQ(RunTime::typeNameOf(nullptr), "");
   // A size that ends the text before its last "::" hides the class.
-  const std::string signature = "void A::f(void)";
-  EXPECT_EQ(RunTime::doGetFullTypeName(signature.c_str(), 3), "");
-  EXPECT_EQ(RunTime::doGetTypeName(signature.c_str(), 3), "");
+  EXPECT_EQ(RunTime::doGetFullTypeName("void A::f(void)", 3), "");
+  EXPECT_EQ(RunTime::doGetTypeName("void A::f(void)", 3), "");
 }
 
 TEST(RunTimeTest, LastIndexOfSearchesDownFromStartAndStaysInsideText) {
@@ -127,24 +103,24 @@ TEST(RunTimeTest, ShortClassNameTakesTextBehindLastColonElseLastInnerBlank) {
 }
 
 TEST(RunTimeTest, AdaptSignatureRewritesGccMemberText) {
-  EXPECT_EQ(RunTime::adaptSignature("virtual std::string Corvane::Wavemill::TextModel::getFullTypeName() const"),
-            "std::string Corvane::Wavemill::TextModel::getFullTypeName(void) const");
-  EXPECT_EQ(
-      RunTime::adaptSignature("std::string Corvane::Wavemill::ModelCollection<T>::getFullTypeName() const [with T "
-                              "= Corvane::Wavemill::TextPair; std::string = std::__cxx11::basic_string<char>]"),
-      "std::string Corvane::Wavemill::ModelCollection<Corvane::Wavemill::TextPair>::getFullTypeName(void) const");
-  EXPECT_EQ(RunTime::adaptSignature("static const std::string& Plain::name(int, const char*)"),
-            "const std::string& Plain::name(void)");
   // Several parameters, values with their own commas and templates, a
-  // parameter named like the namespace in front of it, a pack.
-  EXPECT_EQ(RunTime::adaptSignature("void N::Pair<K, N>::f() const [with K = std::map<int, std::vector<char> >; int N "
-                                    "= 2]"),
-            "void N::Pair<std::map<int, std::vector<char> >, 2>::f(void) const");
-  EXPECT_EQ(RunTime::adaptSignature("void Box<T>::f() && [with T = Box<int>]"), "void Box<Box<int> >::f(void) &&");
-  EXPECT_EQ(RunTime::adaptSignature("void Tuple<Ts>::f() [with Ts = {int, char}]"), "void Tuple<int, char>::f(void)");
-  EXPECT_EQ(RunTime::adaptSignature("void Ch<C>::f() const [with char C = ';']"), "void Ch<';'>::f(void) const");
-  EXPECT_EQ(RunTime::adaptSignature("void A::operator()(std::function<void(int)>) const"),
-            "void A::operator()(void) const");
+  // parameter named like the namespace in front of it, a pack, a character.
+  const std::pair<const char *, const char *> cases[] = {
+      {"virtual std::string Corvane::Wavemill::TextModel::getFullTypeName() const",
+       "std::string Corvane::Wavemill::TextModel::getFullTypeName(void) const"},
+      {"std::string Corvane::Wavemill::ModelCollection<T>::getFullTypeName() const [with T = "
+       "Corvane::Wavemill::TextPair; std::string = std::__cxx11::basic_string<char>]",
+       "std::string Corvane::Wavemill::ModelCollection<Corvane::Wavemill::TextPair>::getFullTypeName(void) const"},
+      {"static const std::string& Plain::name(int, const char*)", "const std::string& Plain::name(void)"},
+      {"void N::Pair<K, N>::f() const [with K = std::map<int, std::vector<char> >; int N = 2]",
+       "void N::Pair<std::map<int, std::vector<char> >, 2>::f(void) const"},
+      {"void Box<T>::f() && [with T = Box<int>]", "void Box<Box<int> >::f(void) &&"},
+      {"void Tuple<Ts>::f() [with Ts = {int, char}]", "void Tuple<int, char>::f(void)"},
+      {"void Ch<C>::f() const [with char C = ';']", "void Ch<';'>::f(void) const"},
+      {"void A::operator()(std::function<void(int)>) const", "void A::operator()(void) const"},
+  };
+  for (const auto &[pretty, expected] : cases)
+    EXPECT_EQ(RunTime::adaptSignature(pretty), expected) << pretty;
 
   const char *box = "std::string Corvane::Wavemill::Box<T>::getFullTypeName() const [with T = int; std::string = "
                     "std::__cxx11::basic_string<char>]";
@@ -160,20 +136,16 @@ TEST(RunTimeTest, MacrosNameTheClassOfTheEnclosingMember) {
   const RunTimeProbeBase &asBase = model;
   EXPECT_EQ(asBase.getTypeName(), "RunTimeProbeModel");
   EXPECT_EQ(asBase.getFullTypeName(), "Corvane.Wavemill.RunTimeProbeModel");
-
   const RunTimeProbeCollection<RunTimeProbePair> pairs;
   EXPECT_EQ(pairs.getTypeName(), "RunTimeProbeCollection`1[[RunTimeProbePair]]");
   EXPECT_EQ(pairs.getFullTypeName(),
             "Corvane::Wavemill::RunTimeProbeCollection`1[[Corvane::Wavemill::RunTimeProbePair]]");
-
   const RunTimeProbeCollection<int> numbers;
   EXPECT_EQ(numbers.getTypeName(), "RunTimeProbeCollection`1[[int]]");
   EXPECT_EQ(numbers.getFullTypeName(), "Corvane::Wavemill::RunTimeProbeCollection`1[[int]]");
-
   const RunTimeProbePlain plain;
   EXPECT_EQ(plain.getTypeName(), "RunTimeProbePlain");
   EXPECT_EQ(plain.getFullTypeName(), "RunTimeProbePlain");
-
   EXPECT_EQ(Deep::Deeper::RunTimeProbeInner::getFullTypeName(), "Corvane.Wavemill.Deep.Deeper.RunTimeProbeInner");
 
   // The compiler's own text of a nested collection ends in the same odd

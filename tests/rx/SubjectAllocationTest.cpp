@@ -5,7 +5,6 @@
 #include <cstdlib>
 #include <new>
 #include <string>
-#include <vector>
 
 // The global allocation functions of this test program are replaced by ones
 // that behave like the usual ones and count, on the thread that asks for it,
@@ -17,8 +16,7 @@ thread_local bool counting = false;
 thread_local long allocations = 0;
 
 void *allocate(std::size_t size) {
-  if (counting)
-    ++allocations;
+  allocations += counting;
   return std::malloc(size == 0 ? 1 : size);
 }
 
@@ -57,12 +55,10 @@ TEST(SubjectTest, OnNextAllocatesNothing) {
   EXPECT_EQ(allocationsOf([&] { subscriber.on_next(value); }), 0); // nobody listens
 
   std::size_t received = 0;
-  std::vector<rxcpp::subscription> subscriptions;
-  for (int i = 0; i < 5; ++i)
-    subscriptions.push_back(
-        subject.get_observable().subscribe([&](const std::string &text) { received += text.size(); }));
+  std::vector<rxcpp::subscription> subscriptions(5);
+  for (auto &each : subscriptions)
+    each = subject.get_observable().subscribe([&](const std::string &text) { received += text.size(); });
   subscriptions[2].unsubscribe();
-
   EXPECT_EQ(allocationsOf([&] {
               for (int i = 0; i < 100; ++i)
                 subscriber.on_next(value);

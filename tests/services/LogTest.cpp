@@ -1,48 +1,37 @@
 #include "wavemill/services/Log.h"
-#include "wavemill/models/Prototype.h"
-#include "wavemill/services/LogBase.h"
 
 #include <gtest/gtest.h>
 
-#include <memory>
 #include <regex>
-#include <string>
-#include <vector>
 
 using namespace Corvane::Wavemill;
 
 namespace {
 
-// Keeps the printed line of every record a channel publishes; the record
-// itself is gone once the call returns.
-class LineProbe {
-public:
+// Keeps the printed line and the time-stamp flag of every record a channel
+// publishes; the record itself is gone once the call returns.
+struct LineProbe {
   explicit LineProbe(LogBase &channel)
       : subscription(channel.getSubject().get_observable().subscribe([this](LogMessage *message) {
           lines.push_back(message->toString());
           stamped.push_back(message->timeStamp);
         })) {}
   ~LineProbe() { subscription.unsubscribe(); }
-
   std::vector<std::string> lines;
   std::vector<bool> stamped;
-
-private:
   rxcpp::subscription subscription;
 };
 
-class AuditLog : public Log {
-public:
+struct AuditLog : Log {
   AuditLog() : Log("Audit") {}
 };
-
 const LogBase::Creator<AuditLog> auditCreator;
 
 const std::string timePattern = "\\[\\d{4}-\\d{2}-\\d{2}\\.\\d{2}:\\d{2}:\\d{2}\\] ";
 
 } // namespace
 
-TEST(LogTest, LevelTextsArePaddedAndOtherLevelsAreEmpty) {
+TEST(LogTest, LineIsChannelPaddedLevelTextAndTheTimeOnlyWhenStamped) {
   const std::vector<std::string> expected{"[TRACE] ", "[DEBUG] ",    "[INFO]  ", "[WARN]  ",
                                           "[ERR]   ", "[CRITICAL] ", "[OFF] "};
   for (int level = 0; level < 7; ++level)
@@ -50,6 +39,8 @@ TEST(LogTest, LevelTextsArePaddedAndOtherLevelsAreEmpty) {
   EXPECT_EQ(LogBase::toString(-1), "");
   EXPECT_EQ(LogBase::toString(7), "");
   EXPECT_EQ(LogMessage("Net", 42, "odd", false).toString(), "[Net]odd");
+  const std::string stamped = LogMessage("Net", 0, "up", true).toString();
+  EXPECT_TRUE(std::regex_match(stamped, std::regex("\\[Net\\]\\[TRACE\\] " + timePattern + "up"))) << stamped;
 }
 
 TEST(LogTest, GetServesRegisteredChannelsAndTheDefaultChannelForOtherNames) {
@@ -93,21 +84,13 @@ TEST(LogTest, WriteLogTextGoesToTheOneLogWhileSharedAndToNamedChannelsOtherwise)
   LineProbe toLog(*Prototype::getInstance<Log>());
   LineProbe toAudit(*LogBase::get("Audit"));
   LineProbe toDefault(*Prototype::getInstance<LogBase>());
-
   ASSERT_TRUE(Log::getShared());
   Log::writeLogText("Audit", 4, "shared");
   Log::setShared(false);
   Log::writeLogText("Audit", 3, "own");
   Log::writeLogText("Nobody", 1, "fallback");
   Log::setShared(true);
-
   EXPECT_EQ(toLog.lines, std::vector<std::string>{"[Audit][ERR]   shared"});
   EXPECT_EQ(toAudit.lines, std::vector<std::string>{"[Audit][WARN]  own"});
   EXPECT_EQ(toDefault.lines, std::vector<std::string>{"[LogBase][DEBUG] fallback"});
-}
-
-TEST(LogTest, MessageLineTakesTheTimeOnlyWhenStamped) {
-  EXPECT_EQ(LogMessage("Net", 5, "down", false).toString(), "[Net][CRITICAL] down");
-  const std::string stamped = LogMessage("Net", 0, "up", true).toString();
-  EXPECT_TRUE(std::regex_match(stamped, std::regex("\\[Net\\]\\[TRACE\\] " + timePattern + "up"))) << stamped;
 }

@@ -4,21 +4,16 @@
 #include <gtest/gtest.h>
 
 #include <chrono>
-#include <memory>
 #include <regex>
-#include <string>
 #include <thread>
-#include <vector>
 
 using namespace Corvane::Wavemill;
 
 namespace {
 
 // A channel that records what it is asked to write, as "<level> <text>".
-class WriteProbe : public LogBase {
-public:
+struct WriteProbe : LogBase {
   void write(int level, const std::string &text) override { lines.push_back(std::to_string(level) + " " + text); }
-
   std::vector<std::string> lines;
 };
 
@@ -39,9 +34,7 @@ TEST(StopwatchTest, ReportsStartAndEndAtInfoLevelAndOnlyTheTimeWithoutAName) {
 }
 
 TEST(StopwatchTest, ElapsedIsZeroUnstartedGrowsWhileRunningAndStaysAfterStop) {
-  Stopwatch idle("idle", nullptr);
-  EXPECT_EQ(idle.elapsedMilliseconds(), 0.0);
-
+  EXPECT_EQ(Stopwatch("idle", nullptr).elapsedMilliseconds(), 0.0);
   const auto running = Stopwatch::startNew("run", nullptr);
   std::this_thread::sleep_for(std::chrono::milliseconds(2));
   const double first = running->elapsedMilliseconds();

@@ -2,7 +2,6 @@
 
 #include <gtest/gtest.h>
 
-#include <functional>
 #include <memory>
 #include <stdexcept>
 
@@ -18,7 +17,6 @@ TEST(FinallyTest, RunsOnceOnEveryWayOutAndReleasesWhatItCaptured) {
   }
   EXPECT_EQ(runs, 1);
   EXPECT_EQ(captured.use_count(), 1);
-
   try {
     Finally guard([&runs] { ++runs; });
     throw std::runtime_error("leave early");

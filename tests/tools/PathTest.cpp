@@ -1,0 +1,135 @@
+#include "wavemill/tools/Path.h"
+#include "wavemill/tools/Tools.h"
+
+#include "support/TempDir.h"
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <filesystem>
+#include <string>
+#include <utility>
+#include <vector>
+
+using namespace Corvane::Wavemill;
+using Corvane::Wavemill::Testing::TempDir;
+
+TEST(PathTest, CombineJoinsWithOneSlashAndKeepsTheOtherSideWhenOneIsEmpty) {
+  EXPECT_EQ(Path::combine("a\\", "/b"), "a/b");
+  EXPECT_EQ(Path::combine("a//", "\\\\b\\c"), "a/b/c");
+  EXPECT_EQ(Path::combine("", "\\b"), "\\b");
+  EXPECT_EQ(Path::combine("a\\", "/"), "a\\");
+  EXPECT_EQ(Path::combine(Path::longPrefix() + "C:\\data", "b"), "\\/\\\\/");
+  EXPECT_TRUE(Path::isLong("\\\\?\\C:\\data"));
+  EXPECT_FALSE(Path::isLong("\\\\"));
+}
+
+TEST(PathTest, FullPathIsAbsoluteFoldedAndLimitedToTheClassicLength) {
+  const auto cwd = Tools::getCurrentDirectory();
+  EXPECT_EQ(Path::getFullPath("a/./b/../c"), cwd + "/a/c");
+  EXPECT_EQ(Path::getFullPath("\\x\\\\y\\..\\z\\"), "/x/z/");
+  EXPECT_EQ(Path::getFullPath("/../.."), "/");
+  EXPECT_EQ(Path::getFullPath("/" + std::string(258, 'a')), "/" + std::string(258, 'a'));
+  EXPECT_EQ(Path::getFullPath("/" + std::string(259, 'a')), "");
+  EXPECT_EQ(Path::getFullPath(""), "");
+}
+
+TEST(PathTest, NamePartsOfAPath) {
+  EXPECT_EQ(Path::getDirectoryName("/data\\logs/a.txt"), "/data/logs");
+  EXPECT_EQ(Path::getDirectoryName("/a.txt"), "/");
+  EXPECT_EQ(Path::getDirectoryName(""), "");
+  EXPECT_EQ(Path::getFileName("dir\\name.txt "), "name.txt");
+  EXPECT_EQ(Path::getFileName("bare "), "bare ");
+  EXPECT_EQ(Path::splitShortName("x\\libwavemill.so.0.1"),
+            std::make_pair(std::string("libwavemill.so.0"), std::string("1")));
+  EXPECT_EQ(Path::splitShortName("a.b/noext"), std::make_pair(std::string("noext"), std::string()));
+}
+
+TEST(PathTest, ParentDirectoryStopsAtTheRootGiven) {
+  EXPECT_EQ(Path::getParentDirectory("/data/logs/today"), "/data/logs/");
+  EXPECT_EQ(Path::getParentDirectory("/data/logs/", "/data/logs"), "/data/logs/");
+  EXPECT_EQ(Path::getParentDirectory("/"), "/");
+  EXPECT_EQ(Path::getParentDirectory(""), "");
+}
+
+TEST(PathTest, PrepareAndCreateDirectoryBuildMissingTreesButNotOverFiles) {
+  TempDir dir;
+  const auto file = dir.path("a\\b/c.txt");
+  EXPECT_EQ(Path::prepare(file), file);
+  EXPECT_TRUE(Path::directoryExist(dir.path("a/b")));
+  EXPECT_FALSE(Path::fileExist(file));
+
+  EXPECT_TRUE(Path::createDirectory(dir.path("a/b/")));
+  Tools::writeText(dir.path("f"), "x");
+  EXPECT_TRUE(Path::fileExist(dir.path("f")));
+  EXPECT_FALSE(Path::fileExist(dir.root()));
+  EXPECT_FALSE(Path::createDirectory(dir.path("f")));
+  EXPECT_EQ(Path::prepare(dir.path("f/g/h.txt")), "");
+  EXPECT_FALSE(Path::createDirectory(""));
+  EXPECT_FALSE(Path::createDirectory(dir.path(std::string(300, 'x'))));
+}
+
+TEST(PathTest, CreateAndRemoveReportRefusalsOfTheFileSystem) {
+  try {
+    Path::createDirectory("/proc/wavemill-test");
+    ADD_FAILURE() << "no exception";
+  } catch (const std::filesystem::filesystem_error &error) {
+    EXPECT_NE(std::string(error.what()).find("create_directory(p): invalid argument"), std::string::npos);
+    EXPECT_TRUE(error.code());
+  }
+  try {
+    Path::removeDirectory("/proc/self/status");
+    ADD_FAILURE() << "no exception";
+  } catch (const std::filesystem::filesystem_error &error) {
+    EXPECT_NE(std::string(error.what()).find("remove_all(p): invalid argument"), std::string::npos);
+  }
+}
+
+TEST(PathTest, RemoveDirectoryRemovesATreeButNeverASystemFolder) {
+  TempDir dir;
+  Path::createDirectory(dir.path("tree/sub"));
+  Tools::writeText(dir.path("tree/sub/f.txt"), "x");
+  EXPECT_TRUE(Path::removeDirectory(dir.path("tree\\")));
+  EXPECT_FALSE(Path::directoryExist(dir.path("tree")));
+  EXPECT_FALSE(Path::removeDirectory(dir.path("tree")));
+  EXPECT_FALSE(Path::removeDirectory(""));
+  // Unprotected, both would throw: nothing in /proc can be removed.
+  EXPECT_FALSE(Path::removeDirectory("\\PROC\\"));
+  EXPECT_FALSE(Path::removeDirectory("/proc/self/.."));
+}
+
+TEST(PathTest, TempFileNamesDifferInTheCounterAloneAndShareTheProcessFolder) {
+  const auto first = Path::getTempFileName();
+  const auto second = Path::getTempFileName();
+  const auto folder = Tools::getTempPath() + "/Corvane/Lumenbay/p_" + std::to_string(Tools::getCurrentProcessId());
+  const auto stem = folder + "/file_" + std::to_string(Tools::getCurrentThreadId()) + "_";
+  ASSERT_EQ(first.compare(0, stem.size(), stem), 0) << first;
+  ASSERT_EQ(second.compare(0, stem.size(), stem), 0) << second;
+  EXPECT_EQ(std::stoull(second.substr(stem.size())), std::stoull(first.substr(stem.size())) + 1);
+  EXPECT_EQ(second.substr(second.size() - 4), ".tmp");
+  EXPECT_FALSE(Path::fileExist(first));
+
+  ASSERT_FALSE(Path::prepare(first).empty());
+  Tools::writeText(first, "x");
+  EXPECT_TRUE(Path::removeTempDirectory());
+  EXPECT_FALSE(Path::directoryExist(folder));
+  EXPECT_FALSE(Path::removeTempDirectory());
+}
+
+TEST(PathTest, PerUserAndTemporaryFoldersOfTheProductFamily) {
+  EXPECT_EQ(Path::getDataDirectory("logs"), "~/.appdata/Corvane/Lumenbay/logs");
+  EXPECT_EQ(Path::getDataDirectory(""), "~/.appdata/Corvane/Lumenbay");
+  EXPECT_EQ(Path::getTempDirectory("\\x"), Tools::getTempPath() + "/x");
+  ASSERT_FALSE(Tools::getTempPath().empty());
+  EXPECT_NE(Tools::getTempPath().back(), '/');
+}
+
+TEST(PathTest, FileNamesListsTheEntriesOfOneFolder) {
+  TempDir dir;
+  Path::createDirectory(dir.path("sub/deeper"));
+  Tools::writeText(dir.path("a.txt"), "");
+  auto names = Path::getFileNames(dir.root());
+  std::sort(names.begin(), names.end());
+  EXPECT_EQ(names, (std::vector<std::string>{"a.txt", "sub"}));
+  EXPECT_TRUE(Path::getFileNames(dir.path("absent")).empty());
+}

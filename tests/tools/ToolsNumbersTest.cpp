@@ -1,0 +1,122 @@
+#include "wavemill/tools/Tools.h"
+
+#include <gtest/gtest.h>
+
+#include <climits>
+#include <clocale>
+#include <cmath>
+#include <limits>
+#include <stdexcept>
+#include <string>
+
+using namespace Corvane::Wavemill;
+
+TEST(ToolsTest, ParseFunctionsTakeTheLeadingNumberOrAnswerTheDefault) {
+  EXPECT_EQ(Tools::parseInt32("", 7), 7);
+  EXPECT_EQ(Tools::parseInt32("12345678901", 7), 7);
+  EXPECT_EQ(Tools::parseInt32(" 42abc", 7), 42);
+  EXPECT_EQ(Tools::parseInt64("9000000000", 0), 9000000000);
+  EXPECT_EQ(Tools::parseInt64("99999999999999999999", 5), 5);
+  EXPECT_EQ(Tools::parseDouble("2.5V", 0), 2.5);
+  EXPECT_EQ(Tools::parseDouble("1e999", -1), -1);
+  EXPECT_EQ(Tools::parseFloat("0.25", 0), 0.25F);
+  EXPECT_EQ(Tools::parseFloat("1e39", 3), 3.0F);
+}
+
+TEST(ToolsTest, TryParseIntLeavesTheValueAloneOnFailure) {
+  int value = 0;
+  EXPECT_TRUE(Tools::tryParse("ff", value, 16));
+  EXPECT_EQ(value, 255);
+  EXPECT_TRUE(Tools::tryParse(" -7x", value, 10));
+  EXPECT_EQ(value, -7);
+  EXPECT_FALSE(Tools::tryParse("zz", value, 10));
+  EXPECT_FALSE(Tools::tryParse("99999999999", value, 10));
+  EXPECT_FALSE(Tools::tryParse("12", value, 1));
+  EXPECT_FALSE(Tools::tryParse("12", value, 37));
+  EXPECT_EQ(value, -7);
+}
+
+TEST(ToolsTest, TryParseDoubleRefusesWhatTheFilterRejects) {
+  double value = -1;
+  for (const char *text : {"", "1e5e3", "e5", "1..2", "+-1", "1.5e3.0", "1,5", "0x10", "inf"}) {
+    EXPECT_FALSE(Tools::tryParse(text, value)) << text;
+  }
+  EXPECT_EQ(value, -1);
+  EXPECT_TRUE(Tools::tryParse("5e", value));
+  EXPECT_EQ(value, 5);
+  EXPECT_TRUE(Tools::tryParse("1 2", value));
+  EXPECT_EQ(value, 1);
+  EXPECT_TRUE(Tools::tryParse(" -1.5E-3", value));
+  EXPECT_EQ(value, -1.5e-3);
+}
+
+TEST(ToolsTest, TryParseDoublePassesConversionFailuresToTheCaller) {
+  double value = 0;
+  for (const char *text : {"-", "- 1", "."}) {
+    try {
+      Tools::tryParse(text, value);
+      ADD_FAILURE() << text;
+    } catch (const std::invalid_argument &e) {
+      EXPECT_STREQ(e.what(), "invalid stod argument");
+    }
+  }
+  try {
+    Tools::tryParse("1e999", value);
+    ADD_FAILURE();
+  } catch (const std::out_of_range &e) {
+    EXPECT_STREQ(e.what(), "stod argument out of range");
+  }
+}
+
+TEST(ToolsTest, ClipFormsDifferInGridOriginAndDirection) {
+  EXPECT_EQ(Tools::clip(-2.0F, -1.0F, 1.0F), -1.0F);
+  EXPECT_EQ(Tools::clip(0.5F, -1.0F, 1.0F), 0.5F);
+  EXPECT_EQ(Tools::clip(7.0, 0.0, 10.0, 4.0), 8.0);
+  EXPECT_EQ(Tools::clip(-1.0, 0.0, 10.0, 4.0), 0.0);
+  EXPECT_EQ(Tools::clip(3.0, 1.0, 10.0, 4.0), 4.0);
+  EXPECT_EQ(Tools::clip(10.0, 0.0, 10.0, 6.0), 10.0);
+  EXPECT_EQ(Tools::clip(1.0, 0.5, 10.0, 4.0), 0.5);
+  EXPECT_EQ(Tools::clip(3.3, 0.0, 10.0, 0.0), 3.3);
+  EXPECT_EQ(Tools::clip(5, 1, 10, 4), 5);
+  EXPECT_EQ(Tools::clip(6, 1, 10, 4), 9);
+  EXPECT_EQ(Tools::clip(10, 1, 10, 4), 9);
+  EXPECT_EQ(Tools::clip(6, 1, 10, -2), 6);
+  EXPECT_EQ(Tools::clip(6, 1, 4, 4), 4);
+  EXPECT_EQ(Tools::clip(INT_MAX, INT_MIN, INT_MAX, INT_MAX), INT_MAX - 1);
+}
+
+TEST(ToolsTest, RoundTakesHalvesAwayFromZeroAndStepsBackAboveHigh) {
+  EXPECT_EQ(Tools::round(9.9, 0.0, 10.0, 4.0), 8.0);
+  EXPECT_EQ(Tools::round(10.0, 0.0, 10.0, 4.0), 8.0);
+  EXPECT_EQ(Tools::round(2.0, 0.0, 10.0, 4.0), 4.0);
+  EXPECT_EQ(Tools::round(-2.0, -10.0, 10.0, 4.0), -4.0);
+  EXPECT_EQ(Tools::round(3.3, 0.0, 2.0, 5.0), 2.0);
+  EXPECT_EQ(Tools::round(5.0, 10.0, 0.0, 0.0), 0.0);
+}
+
+TEST(ToolsTest, ToSingleAvoidsInfinitiesAndDenormals) {
+  EXPECT_EQ(Tools::toSingle(1e39), 1e38F);
+  EXPECT_EQ(Tools::toSingle(-1e39), -1e38F);
+  EXPECT_EQ(Tools::toSingle(1e-38), 0.0F);
+  EXPECT_EQ(Tools::toSingle(-1e-38), 0.0F);
+  EXPECT_EQ(Tools::toSingle(1e-37), 1e-37F);
+  EXPECT_EQ(Tools::toSingle(1.5), 1.5F);
+  EXPECT_TRUE(std::isnan(Tools::toSingle(std::numeric_limits<double>::quiet_NaN())));
+}
+
+TEST(ToolsTest, WideTextRoundTripsThroughTheUserLocale) {
+  const std::string narrow = "Gr\xc3\xbc\xc3\x9f"
+                             "e";
+  const std::wstring wide = Tools::toWString(narrow);
+  const std::string locale = std::setlocale(LC_CTYPE, nullptr);
+  if (locale != "C" && locale != "POSIX" && locale.find("UTF-8") == std::string::npos &&
+      locale.find("utf8") == std::string::npos) {
+    GTEST_SKIP() << "the user's locale " << locale << " is not UTF-8";
+  }
+  EXPECT_EQ(wide, L"Gr\u00fc\u00dfe");
+  EXPECT_EQ(Tools::toString(wide), narrow);
+  EXPECT_EQ(Tools::toWString("ab\0cd", 5), L"ab");
+  EXPECT_EQ(Tools::toWString(nullptr, 3), L"");
+  EXPECT_EQ(Tools::toString(L"xyz", 2), "xy");
+  EXPECT_EQ(Tools::toWString("ok\xff"), L"");
+}

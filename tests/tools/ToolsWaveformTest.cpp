@@ -1,0 +1,192 @@
+#include "wavemill/tools/Tools.h"
+
+#include <gtest/gtest.h>
+
+#include <cfenv>
+#include <cmath>
+#include <complex>
+#include <cstdint>
+#include <filesystem>
+#include <fstream>
+#include <limits>
+#include <memory>
+#include <stdexcept>
+#include <string>
+#include <vector>
+
+using namespace Corvane::Wavemill;
+namespace fs = std::filesystem;
+
+namespace {
+
+using Samples = std::vector<std::complex<double>>;
+using Bytes = std::vector<unsigned char>;
+
+const double notANumber = std::numeric_limits<double>::quiet_NaN();
+
+// The 16-bit words of a byte form, I and Q alternating.
+std::vector<std::int16_t> words(const Bytes &bytes) {
+  std::vector<std::int16_t> result;
+  for (std::size_t i = 0; i + 1 < bytes.size(); i += 2)
+    result.push_back(static_cast<std::int16_t>(static_cast<std::uint16_t>(bytes[i] << 8 | bytes[i + 1])));
+  return result;
+}
+
+std::string writeMarkerFile(const std::string &name, const Bytes &bytes) {
+  const fs::path path =
+      fs::temp_directory_path() / ("wavemill-" + name + "-" + std::to_string(Tools::getCurrentProcessId()));
+  std::ofstream(path, std::ios::binary)
+      .write(reinterpret_cast<const char *>(bytes.data()), static_cast<std::streamsize>(bytes.size()));
+  return path.string();
+}
+
+} // namespace
+
+TEST(ToolsTest, ShortWaveformNameKeepsShortNamesAndCutsLongOnesToNineteenPlusEnding) {
+  EXPECT_EQ(Tools::getShortWaveformName("C:\\waves/dir\\Abc:defghijklmnopqrstuv"), "Abc_defghijklmnopqrstuv");
+  EXPECT_EQ(Tools::getShortWaveformName("abcdefghijklmnopqrstuvw"), "abcdefghijklmnopqrstuvw"); // 23 stay
+  EXPECT_EQ(Tools::getShortWaveformName("abcdefghijklmnopqrstuvwxyz.wfm"), "abcdefghijklmnopqrs.WFM");
+  EXPECT_EQ(Tools::getShortWaveformName("abcdefghijklmnopqrstuvwx"), "abcdefghijklmnopqrs.WFM");
+  EXPECT_EQ(Tools::getShortWaveformName("abcdefghijklmnopqrst.WFM"), "abcdefghijklmnopqrs.WFM");
+  EXPECT_EQ(Tools::getShortWaveformName(""), "");
+  EXPECT_EQ(Tools::getShortWaveformName("folder/"), "");
+}
+
+TEST(ToolsTest, MirrorSpectrumNegatesQOnlyAndSaturatesTheMostNegativeValue) {
+  Bytes bytes{0x12, 0x34, 0x00, 0x01, 0x80, 0x00, 0x80, 0x00, 0x7f, 0xff, 0x7f, 0xff, 0x00, 0x00, 0x00, 0x00};
+  Tools::mirrorSpectrum(bytes);
+  EXPECT_EQ(words(bytes), (std::vector<std::int16_t>{0x1234, -1, -32768, 32767, 32767, -32767, 0, 0}));
+
+  Bytes empty;
+  EXPECT_NO_THROW(Tools::mirrorSpectrum(empty));
+  Bytes six(6, 0x01);
+  try {
+    Tools::mirrorSpectrum(six);
+    ADD_FAILURE() << "no exception";
+  } catch (const std::invalid_argument &e) {
+    EXPECT_STREQ(e.what(), "mirrorSpectrum(waveform): Incorrect waveform length.");
+  }
+  EXPECT_EQ(six, Bytes(6, 0x01));
+}
+
+TEST(ToolsTest, ParseDoubleArrayDropsForeignCharactersBeforeSplitting) {
+  EXPECT_EQ(Tools::parseDoubleArray("1, 2,x3", ","), (std::vector<double>{1, 2, 3}));
+  EXPECT_EQ(Tools::parseDoubleArray("1e3,,-2.5E-1,", ","), (std::vector<double>{1000, -0.25}));
+  EXPECT_EQ(Tools::parseDoubleArray("4\t5", "\t"), (std::vector<double>{4, 5}));
+  EXPECT_TRUE(Tools::parseDoubleArray("abc", ",").empty());
+  try {
+    Tools::parseDoubleArray("", ",");
+    ADD_FAILURE() << "no exception";
+  } catch (const std::invalid_argument &e) {
+    EXPECT_STREQ(e.what(), "input");
+  }
+  EXPECT_THROW(Tools::parseDoubleArray("1,-", ","), std::invalid_argument); // a lone sign reaches stod
+}
+
+TEST(ToolsTest, PeakAndRmsCoverEveryComponentAndHandleSilenceAndNoSamples) {
+  const Samples samples{{1, -0.5}, {2, 0.5}, {0.25, -7}}; // the peak in the last, odd pair
+  EXPECT_EQ(Tools::calculatePeak(samples), 7.0);
+  EXPECT_EQ(Tools::calculatePeak(Samples{{notANumber, 1}}), 1.0);
+  EXPECT_EQ(Tools::calculatePeak(Samples{}), 0.0);
+  EXPECT_EQ(Tools::calculatePeak(std::shared_ptr<Samples>()), 0.0);
+  EXPECT_EQ(Tools::calculatePeak(std::make_shared<Samples>(samples)), 7.0);
+
+  EXPECT_DOUBLE_EQ(Tools::calculateRms(Samples{{3, 4}, {0, 0}}), std::sqrt(12.5));
+  EXPECT_DOUBLE_EQ(Tools::calculateRms(std::make_shared<Samples>(Samples(5, {3, -4}))), 5.0);
+  EXPECT_EQ(Tools::calculateRms(Samples(9, {0, 0})), 1.0);
+  EXPECT_TRUE(std::isnan(Tools::calculateRms(Samples{})));
+  EXPECT_TRUE(std::isnan(Tools::calculateRms(std::shared_ptr<Samples>())));
+}
+
+TEST(ToolsTest, ConvertToWaveformRoundsInTheCurrentModeAndClampsToSixteenBits) {
+  // Six samples, so that both the bulk of the loop and its tail see each case.
+  const double inf = std::numeric_limits<double>::infinity();
+  Bytes bytes(4 * 6, 0xaa);
+  Tools::convertToWaveform(Samples{{1, -1}, {2, -2}, {notANumber, 0.5}, {inf, -inf}, {notANumber, 5}, {-3, 0.5}}, bytes,
+                           1.0);
+  EXPECT_EQ(words(bytes), (std::vector<std::int16_t>{32767, -32767, 32767, -32768, 0, 16384, 32767, -32768, 0, 32767,
+                                                     -32768, 16384}));
+
+  const Samples halves(6, {2.5, -3.5});
+  const auto convertHalves = [&halves](int mode) {
+    Bytes out(4 * halves.size());
+    const int previous = std::fegetround();
+    std::fesetround(mode);
+    Tools::convertToWaveform(halves, out, 1.0 / 32767);
+    std::fesetround(previous);
+    return words(out);
+  };
+  const auto repeated = [](std::int16_t i, std::int16_t q) {
+    std::vector<std::int16_t> result;
+    for (int n = 0; n < 6; ++n)
+      result.insert(result.end(), {i, q});
+    return result;
+  };
+  EXPECT_EQ(convertHalves(FE_TONEAREST), repeated(2, -4)); // halves to even, not away from zero
+  EXPECT_EQ(convertHalves(FE_UPWARD), repeated(3, -3));
+  EXPECT_EQ(convertHalves(FE_DOWNWARD), repeated(2, -4));
+  EXPECT_EQ(convertHalves(FE_TOWARDZERO), repeated(2, -3));
+
+  Bytes tooShort(7, 0xaa); // room for one whole sample; the rest stays as it was
+  Tools::convertToWaveform(Samples{{0, 0}, {0, 0}}, tooShort, 1.0);
+  EXPECT_EQ(tooShort, (Bytes{0, 0, 0, 0, 0xaa, 0xaa, 0xaa}));
+}
+
+TEST(ToolsTest, WaveformBytesScaleThePeakToFullRange) {
+  const Samples samples{{0.5, -0.25}, {0.125, 0}};
+  const auto bytes = Tools::getWaveformBytes(samples, 1.0);
+  EXPECT_EQ(words(*bytes), (std::vector<std::int16_t>{32767, -16384, 8192, 0}));
+  EXPECT_EQ(*Tools::getWaveformBytes(std::make_shared<Samples>(samples), 0.5),
+            *Tools::getWaveformBytes(Samples{{0.5, -0.25}, {0.125, 0}}, 0.5));
+  EXPECT_EQ(*Tools::getWaveformBytes(Samples(3, {0, 0}), 1.0), Bytes(12, 0));
+  EXPECT_TRUE(Tools::getWaveformBytes(std::shared_ptr<Samples>(), 1.0)->empty());
+}
+
+TEST(ToolsTest, BuildMarkersClearsRunsOfFiveOrMoreLowSamplesThatAHighSampleEnds) {
+  const std::complex<double> high{1, 0}, low{0.1, 0.1}, atThreshold{0.5, 0};
+  const Samples samples{high, low, low,  low, low, low, atThreshold, low, low,
+                        low,  low, high, low, low, low, low,         low, low};
+  Bytes markers(samples.size(), 0x80);
+  Tools::buildMarkers(samples, markers, 2, 0.5);
+  // The run of four and the run that lasts to the end keep their bit.
+  Bytes expected(samples.size(), 0x84);
+  for (int i = 1; i <= 5; ++i)
+    expected[i] = 0x80;
+  EXPECT_EQ(markers, expected);
+
+  Bytes untouched(samples.size(), 0x01);
+  Tools::buildMarkers(samples, untouched, -1, 0.5);
+  EXPECT_EQ(untouched, Bytes(samples.size(), 0x01));
+  Bytes fewerMarkers(3, 0);
+  Tools::buildMarkers(samples, fewerMarkers, 0, 0.5);
+  EXPECT_EQ(fewerMarkers, (Bytes{1, 0, 0}));
+}
+
+TEST(ToolsTest, SetBitsWritesTheLowestBitOfTheValueIntoTheBytesThatExist) {
+  Bytes bytes{0x00, 0xff, 0x00, 0xff, 0x00};
+  Tools::setBits(bytes, 0, 1, 2, 2); // 2 has a clear lowest bit
+  EXPECT_EQ(bytes, (Bytes{0x00, 0xfe, 0x00, 0xff, 0x00}));
+  Tools::setBits(bytes, 7, 2, -1, 1);
+  EXPECT_EQ(bytes, (Bytes{0x00, 0xfe, 0x80, 0xff, 0x80}));
+  Tools::setBits(bytes, 1, -2, 3, 0); // byte 0 only
+  Tools::setBits(bytes, 1, 4, 100, 1);
+  Tools::setBits(bytes, 8, 0, -1, 1);
+  EXPECT_EQ(bytes, (Bytes{0x00, 0xfe, 0x80, 0xff, 0x82}));
+}
+
+TEST(ToolsTest, GetPulseGivesStartAndEndOfEachRunOfTheBit) {
+  const std::string small = writeMarkerFile("small", Bytes{0, 2, 3, 0, 1, 2, 2, 2});
+  EXPECT_EQ(Tools::getPulse(small, 100, 1), (std::vector<std::int64_t>{1, 2, 5, 7}));
+  EXPECT_EQ(Tools::getPulse(small, 6, 1), (std::vector<std::int64_t>{1, 2, 5, 5}));
+  EXPECT_EQ(Tools::getPulse(small, 100, 0), (std::vector<std::int64_t>{2, 2, 4, 4}));
+  EXPECT_TRUE(Tools::getPulse(small, -1, 1).empty());
+  EXPECT_TRUE(Tools::getPulse(small + ".missing", 100, 1).empty());
+
+  Bytes large(0x200000 + 10, 0); // a run across the boundary of two read blocks
+  for (std::size_t i = 0x1ffffe; i <= 0x200002; ++i)
+    large[i] = 0x10;
+  const std::string across = writeMarkerFile("large", large);
+  EXPECT_EQ(Tools::getPulse(across, 1 << 30, 4), (std::vector<std::int64_t>{0x1ffffe, 0x200002}));
+  fs::remove(small);
+  fs::remove(across);
+}
