@@ -164,11 +164,27 @@ void applications() {
   report.unsubscribe();
 }
 
+void tools() {
+  section("Tools: configuration files, folders, modules and ping");
+  const std::string data = WAVEMILL_EXAMPLE_DATA;
+  std::cout << "settings.cfg, key-value lines:\n";
+  for (const auto &[key, value] : Tools::readConfig(Path::combine(data, "settings.cfg"), "="))
+    std::cout << "  " << key << " = " << Tools::q(value) << "\n";
+  std::cout << "instrument.xml, one element per line:\n";
+  for (const auto &[key, value] : Tools::readXml(Path::combine(data, "instrument.xml")))
+    std::cout << "  " << key << " = " << Tools::q(value) << "\n";
+  std::cout << "per-user data folder: " << Path::getDataDirectory("Demo") << "\n";
+  std::cout << "module of the library: " << Tools::getLibraryName() << " (" << Tools::getExecutingFileName() << ")\n";
+  std::cout << "host " << Tools::getHostname() << ", process " << Tools::getCurrentProcessId() << "\n";
+  std::cout << "ping 127.0.0.1: " << (Tools::ping("127.0.0.1", 1000) ? "answered" : "no answer") << "\n";
+}
+
 } // namespace
 
 int main() {
   std::cout << "Wavemill demo\n";
   roadOfAChange();
   applications();
+  tools();
   return 0;
 }
