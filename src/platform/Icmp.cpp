@@ -36,6 +36,8 @@ public:
     }
   }
   ~IcmpSocket() {
+    // Not retried on EINTR: Linux frees the descriptor even then, and a retry
+    // could close one that another thread has just been given.
     if (fd >= 0)
       ::close(fd);
   }
@@ -130,6 +132,7 @@ bool sendEcho(const std::string &ipv4, int timeoutInMS) {
     socklen_t fromSize = sizeof from;
     const ssize_t received =
         ::recvfrom(socket.fd, reply.data(), reply.size(), MSG_DONTWAIT, reinterpret_cast<sockaddr *>(&from), &fromSize);
+    // An interrupted or emptied read goes back to the wait with the time left.
     if (received < 0 && errno != EINTR && errno != EAGAIN && errno != EWOULDBLOCK)
       return false;
     if (received > 0 && from.sin_addr.s_addr == target.sin_addr.s_addr &&

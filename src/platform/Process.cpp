@@ -25,6 +25,21 @@ namespace Corvane::Wavemill::Platform {
 
 namespace {
 
+enum class ChildState { Running, Ended, NotAChild };
+
+ChildState pollChild(pid_t pid, int &status) {
+  for (;;) {
+    const pid_t result = ::waitpid(pid, &status, WNOHANG);
+    if (result == pid)
+      return ChildState::Ended;
+    if (result == 0)
+      return ChildState::Running;
+    // A signal handler of the application may interrupt even a polling wait.
+    if (errno != EINTR)
+      return ChildState::NotAChild;
+  }
+}
+
 // The children this library started and has not reaped yet, each with the
 // mark of whether anyone still waits for it. Only these are ever reaped:
 // reaping a child that other code of the process started would steal the
@@ -54,7 +69,7 @@ public:
     std::lock_guard<std::mutex> lock(mutex);
     for (auto it = pids.begin(); it != pids.end();) {
       int status = 0;
-      const bool keep = !it->second || ::waitpid(it->first, &status, WNOHANG) == 0;
+      const bool keep = !it->second || pollChild(it->first, status) == ChildState::Running;
       it = keep ? std::next(it) : pids.erase(it);
     }
   }
@@ -67,21 +82,6 @@ private:
 Children &children() {
   static Children instance;
   return instance;
-}
-
-enum class ChildState { Running, Ended, NotAChild };
-
-ChildState pollChild(pid_t pid, int &status) {
-  for (;;) {
-    const pid_t result = ::waitpid(pid, &status, WNOHANG);
-    if (result == pid)
-      return ChildState::Ended;
-    if (result == 0)
-      return ChildState::Running;
-    // A signal handler of the application may interrupt even a polling wait.
-    if (errno != EINTR)
-      return ChildState::NotAChild;
-  }
 }
 
 int toExitStatus(int status) {
