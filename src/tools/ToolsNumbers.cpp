@@ -127,15 +127,21 @@ bool Tools::tryParse(const std::string &s, double &value) {
 
 // ---- Numbers ----------------------------------------------------------------
 
-float Tools::clip(float value, float low, float high) {
-  if (low > value) {
+namespace {
+
+// The range test both floating clips share: `low` is tested first, so it
+// wins when low > high.
+template <class T> T limit(T value, T low, T high) {
+  if (low > value)
     return low;
-  }
-  if (value > high) {
+  if (value > high)
     return high;
-  }
   return value;
 }
+
+} // namespace
+
+float Tools::clip(float value, float low, float high) { return limit(value, low, high); }
 
 double Tools::clip(double value, double low, double high, double step) {
   if (low > value) {
@@ -147,14 +153,7 @@ double Tools::clip(double value, double low, double high, double step) {
   if (!(step > 0)) {
     return value;
   }
-  const double r = std::floor(value / step + 0.5) * step;
-  if (low > r) {
-    return low;
-  }
-  if (r > high) {
-    return high;
-  }
-  return r;
+  return limit(std::floor(value / step + 0.5) * step, low, high);
 }
 
 int Tools::clip(int value, int low, int high, int step) {
