@@ -9,7 +9,61 @@
 #include <string>
 #include <thread>
 
+// The demo's application classes. They live in a named namespace and are
+// registered while the program loads, so the registry lists them under this
+// program's name and documents can name them.
+namespace Demo {
+
+class Marker : public Corvane::Wavemill::ModelBase {
+public:
+  WAVEMILL_MODEL(Marker)
+  Marker() : Corvane::Wavemill::ModelBase("Demo::Marker") {}
+  std::shared_ptr<Corvane::Wavemill::DoubleSetting> position =
+      init(std::make_shared<Corvane::Wavemill::DoubleSetting>("Position"));
+};
+
+class SignalGenerator : public Corvane::Wavemill::ApplicationBase {
+public:
+  WAVEMILL_MODEL(SignalGenerator)
+  SignalGenerator() : Corvane::Wavemill::ApplicationBase("Demo::SignalGenerator") {}
+
+  std::shared_ptr<Corvane::Wavemill::DoubleSetting> frequency =
+      init(std::make_shared<Corvane::Wavemill::DoubleSetting>("Frequency", 1e6, 1.0, 6e9, 0.0));
+  std::shared_ptr<Corvane::Wavemill::DoubleSetting> period =
+      init(std::make_shared<Corvane::Wavemill::DoubleSetting>("Period", 1e-6, 0.0, 1.0, 0.0));
+  std::shared_ptr<Corvane::Wavemill::DoubleSetting> level =
+      init(std::make_shared<Corvane::Wavemill::DoubleSetting>("Level", -10.0, -130.0, 20.0, 0.0));
+  std::shared_ptr<Corvane::Wavemill::BoolSetting> output =
+      init(std::make_shared<Corvane::Wavemill::BoolSetting>("Output"));
+  std::shared_ptr<Corvane::Wavemill::SubSetting<Corvane::Wavemill::ModelCollection<Marker>>> markers =
+      init(std::make_shared<Corvane::Wavemill::SubSetting<Corvane::Wavemill::ModelCollection<Marker>>>("Markers"));
+  std::shared_ptr<Corvane::Wavemill::SubSetting<Corvane::Wavemill::TextMap>> notes =
+      init(std::make_shared<Corvane::Wavemill::SubSetting<Corvane::Wavemill::TextMap>>("Notes"));
+
+  void couple(Corvane::Wavemill::Transaction *transaction) override {
+    Corvane::Wavemill::ApplicationBase::couple(transaction);
+    if (transaction->getSetting() == frequency.get())
+      period->setValue(1.0 / frequency->getValue());
+  }
+};
+
+// A second application: a spectrum analyzer.
+class Analyzer : public Corvane::Wavemill::ApplicationBase {
+public:
+  WAVEMILL_MODEL(Analyzer)
+  Analyzer() : Corvane::Wavemill::ApplicationBase("Demo::Analyzer") {}
+  std::shared_ptr<Corvane::Wavemill::DoubleSetting> span =
+      init(std::make_shared<Corvane::Wavemill::DoubleSetting>("Span", 1e6, 1.0, 1e9, 0.0));
+};
+
+} // namespace Demo
+
+WAVEMILL_REGISTER_MODEL(Demo::Marker)
+WAVEMILL_REGISTER_MODEL(Demo::SignalGenerator)
+WAVEMILL_REGISTER_MODEL(Demo::Analyzer)
+
 using namespace Corvane::Wavemill;
+using namespace Demo;
 
 namespace {
 
@@ -81,40 +135,6 @@ void roadOfAChange() {
 
 // An application: a signal generator whose coupling keeps period and
 // frequency consistent, with a list of markers.
-class Marker : public ModelBase {
-public:
-  WAVEMILL_MODEL(Marker)
-  Marker() : ModelBase("Demo::Marker") {}
-  std::shared_ptr<DoubleSetting> position = init(std::make_shared<DoubleSetting>("Position"));
-};
-
-class SignalGenerator : public ApplicationBase {
-public:
-  WAVEMILL_MODEL(SignalGenerator)
-  SignalGenerator() : ApplicationBase("Demo::SignalGenerator") {}
-
-  std::shared_ptr<DoubleSetting> frequency = init(std::make_shared<DoubleSetting>("Frequency", 1e6, 1.0, 6e9, 0.0));
-  std::shared_ptr<DoubleSetting> period = init(std::make_shared<DoubleSetting>("Period", 1e-6, 0.0, 1.0, 0.0));
-  std::shared_ptr<DoubleSetting> level = init(std::make_shared<DoubleSetting>("Level", -10.0, -130.0, 20.0, 0.0));
-  std::shared_ptr<BoolSetting> output = init(std::make_shared<BoolSetting>("Output"));
-  std::shared_ptr<SubSetting<ModelCollection<Marker>>> markers =
-      init(std::make_shared<SubSetting<ModelCollection<Marker>>>("Markers"));
-
-  void couple(Transaction *transaction) override {
-    ApplicationBase::couple(transaction);
-    if (transaction->getSetting() == frequency.get())
-      period->setValue(1.0 / frequency->getValue());
-  }
-};
-
-// A second application: a spectrum analyzer.
-class Analyzer : public ApplicationBase {
-public:
-  WAVEMILL_MODEL(Analyzer)
-  Analyzer() : ApplicationBase("Demo::Analyzer") {}
-  std::shared_ptr<DoubleSetting> span = init(std::make_shared<DoubleSetting>("Span", 1e6, 1.0, 1e9, 0.0));
-};
-
 void applications() {
   section("Applications, selection and dirtiness");
   auto manager = std::make_shared<ApplicationManager>();
@@ -161,7 +181,49 @@ void applications() {
   generator->reset();
   std::cout << "  -> frequency " << generator->frequency->toString() << ", markers kept: " << markers->getCount()
             << "\n";
+  std::cout << "keep notes in the generator's text map\n";
+  auto notes = generator->notes->getValue();
+  notes->setItem("Cable", "N-type, 1 m");
+  notes->setItem("Owner", "Lab 3");
+  notes->setItem("Cable", "SMA, 0.5 m");
+  std::cout << "  -> Cable = " << Tools::q(notes->getItem("Cable")) << ", Owner = " << Tools::q(notes->getItem("Owner"))
+            << ", Unknown = " << Tools::q(notes->getItem("Unknown"))
+            << ", pairs: " << notes->Items->getValue()->getCount() << "\n";
   report.unsubscribe();
+}
+
+void namesAndLibraries() {
+  section("Class names out, objects back, and the libraries behind them");
+  Activator activator;
+  std::cout << "before: SignalGenerator is saved as " << Tools::q(activator.toName(std::make_shared<SignalGenerator>()))
+            << "\n";
+  std::cout << "updateFullTypeNames(\"WavemillDemo\", \"Corvane.Demo\")\n";
+  activator.updateFullTypeNames("WavemillDemo", "Corvane.Demo");
+  const std::shared_ptr<IModel> models[] = {
+      std::make_shared<SignalGenerator>(), std::make_shared<Analyzer>(),
+      std::make_shared<Marker>(),          std::make_shared<ModelCollection<Marker>>(),
+      std::make_shared<TextModel>(),       std::make_shared<ApplicationManager>()};
+  for (const auto &model : models)
+    std::cout << "  " << model->getTypeName() << " is saved as " << Tools::q(activator.toName(model)) << "\n";
+
+  std::cout << "objects back from each accepted form of a name:\n";
+  for (const char *name : {"Corvane.Demo.SignalGenerator, WavemillDemo", "Demo.SignalGenerator",
+                           "Other.Namespace.SignalGenerator, OtherAssembly", "SignalGenerator",
+                           "System.Collections.ObjectModel.Collection`1[[Corvane.Demo.Marker, WavemillDemo]], mscorlib",
+                           "Collection`1[[Marker]]", "Corvane.Demo.Oscilloscope, WavemillDemo"}) {
+    auto made = activator.toInstance(name);
+    std::cout << "  " << Tools::q(name) << " (short " << Tools::q(Activator::makeShortTypeName(name)) << ") -> "
+              << (made ? made->getTypeName() : std::string("nothing")) << "\n";
+  }
+
+  std::cout << "libraries that contribute model classes:\n";
+  LibraryService libraries;
+  for (const auto &library : libraries.getLibraries(true)) {
+    std::cout << "  #" << library->getIndex() << " " << library->getName() << ":";
+    for (const auto &model : library->getModels())
+      std::cout << " " << model->getTypeName();
+    std::cout << "\n";
+  }
 }
 
 void tools() {
@@ -185,6 +247,7 @@ int main() {
   std::cout << "Wavemill demo\n";
   roadOfAChange();
   applications();
+  namesAndLibraries();
   tools();
   return 0;
 }

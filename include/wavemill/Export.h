@@ -13,3 +13,12 @@
 #else
 #define WAVEMILL_API __attribute__((visibility("default")))
 #endif
+
+/// WAVEMILL_LOCAL keeps a symbol inside the module that compiled it, even when
+/// that module exports everything else: each module then has its own copy,
+/// which is how a class template finds out which module instantiated it.
+#if defined(_WIN32)
+#define WAVEMILL_LOCAL
+#else
+#define WAVEMILL_LOCAL __attribute__((visibility("hidden")))
+#endif

@@ -15,7 +15,9 @@ namespace Corvane::Wavemill {
 
 namespace {
 
-const std::string settingMapKey = "SettingMap";
+// A plain character constant, so that models built by load-time registration in
+// other translation units never meet an unconstructed string.
+constexpr const char *settingMapKey = "SettingMap";
 
 // Returns a non-owning shared pointer, for handing `this` to operations that
 // take shared pointers without claiming ownership.

@@ -136,4 +136,19 @@ int processImagePath(int pid, std::size_t capacity, std::string &path) {
   return readLink("/proc/" + process + "/exe", capacity, path);
 }
 
+void *loadModule(const std::string &path, std::string &error) {
+  void *module = ::dlopen(path.c_str(), RTLD_NOW | RTLD_GLOBAL | RTLD_NODELETE);
+  if (module == nullptr) {
+    const char *message = ::dlerror();
+    error = message == nullptr ? "cannot load " + path : message;
+  }
+  return module;
+}
+
+void *moduleSymbol(void *module, const char *name) {
+  if (module == nullptr || name == nullptr)
+    return nullptr;
+  return ::dlsym(module, name);
+}
+
 } // namespace Corvane::Wavemill::Platform

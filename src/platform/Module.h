@@ -1,5 +1,7 @@
 #pragma once
 
+#include "wavemill/Export.h"
+
 #include <cstddef>
 #include <string>
 
@@ -26,5 +28,14 @@ int moduleFileNameByName(const std::string &name, std::size_t capacity, std::str
 
 // The program file of the process `pid`; a negative `pid` means this process.
 int processImagePath(int pid, std::size_t capacity, std::string &path);
+
+// Loads the shared library at `path` (or finds it when it is loaded already)
+// and answers its handle, or null with the loader's message in `error`. The
+// library stays loaded to process exit: classes it registers must outlive
+// every model made from them.
+WAVEMILL_API void *loadModule(const std::string &path, std::string &error);
+
+// The address of the function `name` in the loaded library `module`, or null.
+WAVEMILL_API void *moduleSymbol(void *module, const char *name);
 
 } // namespace Corvane::Wavemill::Platform

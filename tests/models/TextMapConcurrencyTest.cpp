@@ -1,0 +1,49 @@
+#include "wavemill/models/Interceptor.h"
+#include "wavemill/models/TextMap.h"
+
+#include <gtest/gtest.h>
+
+#include <atomic>
+#include <string>
+#include <thread>
+#include <vector>
+
+using namespace Corvane::Wavemill;
+
+// Writers add and overwrite keys while readers look them up; every value a
+// reader sees must be one a writer stored, and the map ends with one pair
+// per key.
+TEST(TextMapConcurrencyTest, ReadersAndWritersShareTheMap) {
+  auto map = std::make_shared<TextMap>();
+  Interceptor interceptor(map);
+  map->activateSettings(&interceptor, nullptr);
+
+  constexpr int keys = 40;
+  constexpr int rounds = 20;
+  std::atomic<int> foreign{0};
+  std::vector<std::thread> threads;
+  for (int writer = 0; writer < 2; ++writer)
+    threads.emplace_back([&map, writer] {
+      for (int round = 0; round < rounds; ++round)
+        for (int key = 0; key < keys; ++key)
+          map->setItem("k" + std::to_string(key), "v" + std::to_string(writer));
+    });
+  for (int reader = 0; reader < 2; ++reader)
+    threads.emplace_back([&map, &foreign] {
+      for (int round = 0; round < rounds; ++round)
+        for (int key = 0; key < keys; ++key) {
+          auto value = map->getItem("k" + std::to_string(key));
+          if (!value.empty() && value != "v0" && value != "v1")
+            ++foreign;
+        }
+    });
+  for (auto &thread : threads)
+    thread.join();
+
+  EXPECT_EQ(foreign.load(), 0);
+  EXPECT_EQ(map->Items->getValue()->getCount(), keys);
+  for (int key = 0; key < keys; ++key) {
+    auto value = map->getItem("k" + std::to_string(key));
+    EXPECT_TRUE(value == "v0" || value == "v1") << value;
+  }
+}

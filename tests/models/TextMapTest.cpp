@@ -1,0 +1,108 @@
+#include "wavemill/models/TextMap.h"
+#include "wavemill/models/Couplings.h"
+#include "wavemill/models/Interceptor.h"
+#include "wavemill/models/ModelContainer.h"
+#include "wavemill/models/TextModel.h"
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+
+using namespace Corvane::Wavemill;
+
+TEST(TextModelTest, NamesSettingsAndLoadTimeRegistration) {
+  TextModel text;
+  EXPECT_EQ(text.getTypeName(), "TextModel");
+  EXPECT_EQ(text.getFullTypeName(), "Corvane.Wavemill.TextModel");
+  ASSERT_EQ(text.getAllSettings().size(), 2u);
+  EXPECT_EQ(text.getAllSettings()[1], text.Text);
+  EXPECT_EQ(text.Text->getName(), "Text");
+  EXPECT_EQ(text.getPrototype(), Prototype::getInstance<TextModel>());
+
+  const auto &models = Prototype::getInstance<ModelContainer>()->getModels();
+  EXPECT_NE(std::find(models.begin(), models.end(), Prototype::getInstance<TextModel>()), models.end());
+
+  // A pair's settings are at their defaults only when given empty texts.
+  TextPair pair("Unit", "Hz");
+  EXPECT_EQ(pair.getTypeName(), "TextPair");
+  EXPECT_EQ(pair.Key->getValue(), "Unit");
+  EXPECT_FALSE(pair.Key->isDefaultValue());
+  EXPECT_FALSE(pair.Value->isDefaultValue());
+  TextPair empty("", "");
+  EXPECT_TRUE(empty.Key->isDefaultValue());
+  EXPECT_TRUE(empty.Value->isDefaultValue());
+}
+
+class TextMapTest : public testing::Test {
+protected:
+  TextMapTest() {
+    map->activateSettings(&interceptor, nullptr);
+    map->setCouplings(std::make_shared<Couplings>([this](ModelBase *, Transaction *transaction) {
+      ++couples;
+      method = transaction->getMethodName();
+      auto key = transaction->getSettingAt(0);
+      auto value = transaction->getSettingAt(1);
+      arguments = (key ? key->toString() : "?") + "=" + (value ? value->toString() : "?");
+    }));
+  }
+  std::shared_ptr<TextMap> map = std::make_shared<TextMap>();
+  Interceptor interceptor{map};
+  int couples = 0;
+  std::string method;
+  std::string arguments;
+};
+
+TEST_F(TextMapTest, SetAndGetItems) {
+  EXPECT_EQ(map->getItem("Unit"), "");
+  EXPECT_EQ(map->getTypeName(), "TextMap");
+  EXPECT_EQ(map->Items->getName(), "Items");
+
+  map->setItem("Unit", "Hz");
+  EXPECT_EQ(couples, 1);
+  EXPECT_EQ(method, "setItem");
+  EXPECT_EQ(arguments, "Unit=Hz");
+
+  map->setItem("Unit", "kHz");
+  map->setItem("Mode", "CW");
+  EXPECT_EQ(map->Items->getValue()->getCount(), 2);
+  EXPECT_EQ(map->getItem("Unit"), "kHz");
+  EXPECT_EQ(map->getItem("Mode"), "CW");
+  EXPECT_EQ(map->getItem("unit"), "");
+
+  // Storing the same value again changes nothing but still couples.
+  int changes = 0;
+  auto pair = map->Items->getValue()->getItem(0);
+  auto subscription = pair->Value->getSubject().get_observable().subscribe([&](const SettingChange &) { ++changes; });
+  map->setItem("Unit", "kHz");
+  EXPECT_EQ(changes, 0);
+  EXPECT_EQ(couples, 4);
+  map->setItem("Unit", "MHz");
+  EXPECT_EQ(changes, 1);
+  subscription.unsubscribe();
+}
+
+TEST_F(TextMapTest, IndexFollowsRecallAndCopies) {
+  // Pairs put into the collection directly are found only after the index
+  // is rebuilt; of two equal keys the later wins.
+  auto pairs = map->Items->getValue();
+  pairs->add(std::make_shared<TextPair>("Unit", "Hz"));
+  pairs->add(std::make_shared<TextPair>("Unit", "dBm"));
+  EXPECT_EQ(map->getItem("Unit"), "");
+  map->onDeserialized();
+  EXPECT_EQ(map->getItem("Unit"), "dBm");
+
+  // A copy brings the index along, also into a map of another tree.
+  map->setItem("Mode", "CW");
+  auto other = std::make_shared<TextMap>();
+  EXPECT_TRUE(other->copyFrom(map));
+  EXPECT_EQ(other->getItem("Unit"), "dBm");
+  EXPECT_EQ(other->getItem("Mode"), "CW");
+  auto twin = std::dynamic_pointer_cast<TextMap>(map->duplicate());
+  ASSERT_TRUE(twin);
+  EXPECT_EQ(twin->getItem("Mode"), "CW");
+  EXPECT_TRUE(twin->equals(map));
+
+  EXPECT_FALSE(other->copyFrom(std::make_shared<TextModel>()));
+  EXPECT_FALSE(other->copyFrom(other));
+  EXPECT_EQ(other->getItem("Mode"), "CW");
+}

@@ -1,0 +1,97 @@
+#include "wavemill/services/LibraryService.h"
+#include "wavemill/models/Activator.h"
+#include "wavemill/models/ModelContainer.h"
+#include "wavemill/models/TextModel.h"
+
+#include "platform/Module.h"
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+
+using namespace Corvane::Wavemill;
+
+namespace LibraryTests {
+
+struct Probe : ModelBase {
+  WAVEMILL_MODEL(Probe)
+  Probe() : ModelBase("LibraryTests::Probe") {}
+};
+struct Gauge : ModelBase {
+  WAVEMILL_MODEL(Gauge)
+  Gauge() : ModelBase("LibraryTests::Gauge") {}
+};
+
+std::shared_ptr<Library> find(const std::vector<std::shared_ptr<Library>> &libraries, const std::string &name) {
+  for (const auto &library : libraries)
+    if (library->getName() == name)
+      return library;
+  return nullptr;
+}
+
+std::vector<std::string> typeNames(const Library &library) {
+  std::vector<std::string> names;
+  for (const auto &model : library.getModels())
+    names.push_back(model->getTypeName());
+  std::sort(names.begin(), names.end());
+  return names;
+}
+
+} // namespace LibraryTests
+
+WAVEMILL_REGISTER_MODEL(LibraryTests::Probe)
+WAVEMILL_REGISTER_MODEL(LibraryTests::Gauge)
+
+using namespace LibraryTests;
+
+// The registered classes are listed under the module that holds them; a
+// module loaded later appears after a reload, and its classes can be made
+// by name once the Activator knows them.
+TEST(LibraryServiceTest, ModulesListTheirClasses) {
+  Activator activator;
+  LibraryService service;
+  auto libraries = service.getLibraries(false);
+  ASSERT_TRUE(find(libraries, "wavemill"));
+  EXPECT_EQ(typeNames(*find(libraries, "wavemill")), std::vector<std::string>{"TextModel"});
+  ASSERT_TRUE(find(libraries, "wavemill_services_tests"));
+  EXPECT_EQ(typeNames(*find(libraries, "wavemill_services_tests")), (std::vector<std::string>{"Gauge", "Probe"}));
+  EXPECT_EQ(find(libraries, "wavemill")->toString(), "wavemill");
+
+  // By ascending name; the index counts first appearance.
+  auto names = service.getNames();
+  EXPECT_TRUE(std::is_sorted(names.begin(), names.end()));
+  std::vector<std::uint64_t> indices;
+  for (const auto &library : libraries)
+    indices.push_back(library->getIndex());
+  std::sort(indices.begin(), indices.end());
+  for (std::size_t i = 0; i < indices.size(); ++i)
+    EXPECT_EQ(indices[i], i);
+
+  std::string error;
+  ASSERT_TRUE(Platform::loadModule(WAVEMILL_TEST_PLUGIN, error)) << error;
+
+  // Cached until asked to reload.
+  EXPECT_FALSE(find(service.getLibraries(false), "wavemill_test_plugin"));
+  EXPECT_EQ(service.getMap().size(), libraries.size());
+  auto plugin = find(service.getLibraries(true), "wavemill_test_plugin");
+  ASSERT_TRUE(plugin);
+  EXPECT_EQ(typeNames(*plugin), (std::vector<std::string>{"Marker", "Sweep"}));
+
+  EXPECT_FALSE(activator.toInstance("Plugins.Sweep"));
+  activator.updateFullTypeNames("Plugins", "Vendor.Plugins");
+  auto sweep = activator.toInstance("Vendor.Plugins.Sweep, Plugins");
+  ASSERT_TRUE(sweep);
+  EXPECT_EQ(sweep->getTypeName(), "Sweep");
+  EXPECT_EQ(activator.toName(sweep), "Vendor.Plugins.Sweep, Plugins");
+  EXPECT_TRUE(activator.toInstance("Other.Sweep, Elsewhere"));
+
+  // The list of markers held by the sweep got its descriptor, in the
+  // plug-in's module.
+  auto markers = activator.toInstance("Collection`1[[Marker]]");
+  ASSERT_TRUE(markers);
+  EXPECT_TRUE(markers->isCollection());
+  EXPECT_EQ(typeNames(*find(service.getLibraries(true), "wavemill_test_plugin")),
+            (std::vector<std::string>{"Marker", "ModelCollection`1[[Marker]]", "Sweep"}));
+
+  EXPECT_EQ(Library::getLibraryName(nullptr), Tools::getLibraryName(nullptr));
+}
