@@ -61,6 +61,10 @@ public:
 WAVEMILL_REGISTER_MODEL(Demo::Marker)
 WAVEMILL_REGISTER_MODEL(Demo::SignalGenerator)
 WAVEMILL_REGISTER_MODEL(Demo::Analyzer)
+// The generator keeps notes in a TextMap; its classes are registered so that
+// the notes are saved and recalled with the rest.
+WAVEMILL_REGISTER_MODEL(Corvane::Wavemill::TextMap)
+WAVEMILL_REGISTER_MODEL(Corvane::Wavemill::TextPair)
 
 using namespace Corvane::Wavemill;
 using namespace Demo;
@@ -226,6 +230,75 @@ void namesAndLibraries() {
   }
 }
 
+std::shared_ptr<SignalGenerator> generatorOf(const std::shared_ptr<ApplicationManager> &manager) {
+  return std::dynamic_pointer_cast<SignalGenerator>(manager->getApplications()->getItem(0));
+}
+
+void printGenerator(const char *when, const std::shared_ptr<ApplicationManager> &manager) {
+  auto generator = generatorOf(manager);
+  if (!generator) {
+    std::cout << "  " << when << ": no generator\n";
+    return;
+  }
+  std::cout << "  " << when << ": frequency " << generator->frequency->toString() << ", level "
+            << generator->level->toString() << ", markers " << generator->markers->getValue()->getCount()
+            << ", note Cable = " << Tools::q(generator->notes->getValue()->getItem("Cable"))
+            << ", dirty=" << generator->Dirty->toString() << "\n";
+}
+
+void saveAndRecall() {
+  section("Save and recall");
+  auto manager = std::make_shared<ApplicationManager>();
+  Interceptor interceptor(manager);
+  manager->activateSettings(&interceptor, nullptr);
+  auto generator = std::make_shared<SignalGenerator>();
+  generator->Name->setValue("Generator");
+  manager->getApplications()->add(generator);
+  manager->getApplications()->add(std::make_shared<Analyzer>());
+  generator->frequency->setValue(2.5e9);
+  generator->level->setValue(-20.0);
+  generator->markers->getValue()->addItem()->position->setValue(0.5);
+  generator->notes->getValue()->setItem("Cable", "SMA, 0.5 m");
+
+  JsonSerializer serializer;
+  serializer.getActivator()->updateFullTypeNames("WavemillDemo", "Corvane.Demo");
+  const std::string file =
+      Path::combine(Tools::getTempPath(), "wavemill-demo-" + std::to_string(Tools::getCurrentProcessId()) + ".json");
+  Tools::writeText(file, serializer.serialize(manager));
+  std::cout << "saved the tree to " << file << ":\n" << Tools::readText(file);
+
+  printGenerator("saved", manager);
+  std::cout << "change frequency, level, markers and notes\n";
+  generator->frequency->setValue(1e6);
+  generator->level->setValue(5.0);
+  generator->markers->getValue()->addItem();
+  generator->notes->getValue()->setItem("Cable", "N-type");
+  printGenerator("changed", manager);
+
+  std::cout << "recall the file into the existing tree (deserializeToExistObject under beginRecall)\n";
+  {
+    auto recall = manager->beginRecall();
+    serializer.deserializeToExistObject(JsonSerializer::parse(Tools::readText(file)), manager);
+  }
+  printGenerator("recalled", manager);
+  std::cout << "  the same generator object as before: " << (generatorOf(manager) == generator ? "yes" : "no") << "\n";
+
+  std::cout << "recall the file into a fresh tree (deserialize)\n";
+  auto fresh = std::dynamic_pointer_cast<ApplicationManager>(serializer.deserialize(Tools::readText(file)));
+  if (fresh) {
+    Interceptor freshInterceptor(fresh);
+    fresh->activateSettings(&freshInterceptor, nullptr);
+    printGenerator("fresh", fresh);
+    fresh->deactivateSettings();
+  }
+  std::remove(file.c_str());
+
+  std::cout << "display data of the analyzer (every stored setting with its limits and flags):\n";
+  DisplayDataSerializer display;
+  display.getActivator()->updateFullTypeNames("WavemillDemo", "Corvane.Demo");
+  std::cout << display.serialize(manager->getApplications()->getItem(1));
+}
+
 void tools() {
   section("Tools: configuration files, folders, modules and ping");
   const std::string data = WAVEMILL_EXAMPLE_DATA;
@@ -248,6 +321,7 @@ int main() {
   roadOfAChange();
   applications();
   namesAndLibraries();
+  saveAndRecall();
   tools();
   return 0;
 }

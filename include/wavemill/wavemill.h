@@ -5,6 +5,12 @@
 
 #include "wavemill/Export.h"
 #include "wavemill/instrument/WSAClass.h"
+#include "wavemill/json/ConverterBase.h"
+#include "wavemill/json/DisplayDataSerializer.h"
+#include "wavemill/json/JToken.h"
+#include "wavemill/json/JsonSerializer.h"
+#include "wavemill/json/JsonToSettingVisitor.h"
+#include "wavemill/json/SettingToJsonVisitor.h"
 #include "wavemill/models/ActionSetting.h"
 #include "wavemill/models/Activator.h"
 #include "wavemill/models/ApplicationBase.h"

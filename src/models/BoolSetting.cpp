@@ -1,5 +1,7 @@
 #include "wavemill/models/BoolSetting.h"
 
+#include "wavemill/json/ConverterBase.h"
+#include "wavemill/models/Prototype.h"
 #include "wavemill/models/SettingVisitor.h"
 
 #include <cctype>
@@ -29,5 +31,11 @@ void BoolSetting::setCommonValue(std::int64_t v) { setValue(v != 0); }
 void BoolSetting::setCommonValue(int v) { setValue(v != 0); }
 void BoolSetting::setCommonValue(bool v) { setValue(v); }
 void BoolSetting::visit(SettingVisitor *visitor) { visitor->dispatch(this); }
+
+std::shared_ptr<IConverter> BoolSetting::getConverter() const {
+  if (auto chosen = Setting::getConverter())
+    return chosen;
+  return Prototype::getInstance<OnOffConverter>();
+}
 
 } // namespace Corvane::Wavemill

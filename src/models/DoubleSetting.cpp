@@ -1,5 +1,7 @@
 #include "wavemill/models/DoubleSetting.h"
 
+#include "wavemill/json/ConverterBase.h"
+#include "wavemill/models/Prototype.h"
 #include "wavemill/models/SettingVisitor.h"
 
 #include <cerrno>
@@ -46,6 +48,12 @@ double DoubleSetting::validateValue(const double &v) const {
   if (minimum > v)
     return minimum;
   return v;
+}
+
+std::shared_ptr<IConverter> DoubleSetting::getConverter() const {
+  if (auto chosen = Setting::getConverter())
+    return chosen;
+  return Prototype::getInstance<DoubleConverter>();
 }
 
 } // namespace Corvane::Wavemill

@@ -1,5 +1,7 @@
 #include "wavemill/models/Int32Setting.h"
 
+#include "wavemill/json/ConverterBase.h"
+#include "wavemill/models/Prototype.h"
 #include "wavemill/models/SettingVisitor.h"
 
 #include <cerrno>
@@ -45,6 +47,12 @@ int Int32Setting::validateValue(const int &v) {
   if (minimum > v)
     return minimum;
   return v;
+}
+
+std::shared_ptr<IConverter> Int32Setting::getConverter() const {
+  if (auto chosen = Setting::getConverter())
+    return chosen;
+  return Prototype::getInstance<Int32Converter>();
 }
 
 } // namespace Corvane::Wavemill

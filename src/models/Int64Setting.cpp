@@ -1,5 +1,7 @@
 #include "wavemill/models/Int64Setting.h"
 
+#include "wavemill/json/ConverterBase.h"
+#include "wavemill/models/Prototype.h"
 #include "wavemill/models/SettingVisitor.h"
 
 #include <cerrno>
@@ -40,6 +42,12 @@ std::int64_t Int64Setting::validateValue(const std::int64_t &v) const {
   if (minimum > v)
     return minimum;
   return v;
+}
+
+std::shared_ptr<IConverter> Int64Setting::getConverter() const {
+  if (auto chosen = Setting::getConverter())
+    return chosen;
+  return Prototype::getInstance<Int64Converter>();
 }
 
 } // namespace Corvane::Wavemill

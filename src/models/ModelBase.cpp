@@ -13,6 +13,9 @@
 
 namespace Corvane::Wavemill {
 
+const std::string ModelBase::MissingSettings_key = "MissingSettings";
+const std::string ModelBase::SettingMap_key = "SettingMap";
+
 namespace {
 
 // A plain character constant, so that models built by load-time registration in

@@ -1,9 +1,11 @@
 #include "wavemill/models/Setting.h"
 
+#include "wavemill/json/ConverterBase.h"
 #include "wavemill/models/IConverter.h"
 #include "wavemill/models/IModel.h"
 #include "wavemill/models/Interceptor.h"
 #include "wavemill/models/ModelBase.h"
+#include "wavemill/models/Prototype.h"
 #include "wavemill/models/Transaction.h"
 
 namespace Corvane::Wavemill {
@@ -39,7 +41,13 @@ void Setting::deactivate() {
 void Setting::reset() {}
 void Setting::copyFrom(const std::shared_ptr<Setting> &) {}
 
-std::shared_ptr<IConverter> Setting::getConverter() const { return converter; }
+std::shared_ptr<IConverter> Setting::getConverter() const {
+  if (converter)
+    return converter;
+  if (hasFlag(ParameterBits::EnumKind))
+    return Prototype::getInstance<EnumConverterBase>();
+  return nullptr;
+}
 
 void Setting::setConverter(std::shared_ptr<IConverter> value) { converter = std::move(value); }
 

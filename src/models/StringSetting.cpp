@@ -1,5 +1,7 @@
 #include "wavemill/models/StringSetting.h"
 
+#include "wavemill/json/ConverterBase.h"
+#include "wavemill/models/Prototype.h"
 #include "wavemill/models/SettingVisitor.h"
 
 namespace Corvane::Wavemill {
@@ -20,5 +22,11 @@ bool StringSetting::parse(const std::string &text) {
 
 void StringSetting::setCommonValue(std::string v) { setValue(v); }
 void StringSetting::visit(SettingVisitor *visitor) { visitor->dispatch(this); }
+
+std::shared_ptr<IConverter> StringSetting::getConverter() const {
+  if (auto chosen = Setting::getConverter())
+    return chosen;
+  return Prototype::getInstance<StringConverter>();
+}
 
 } // namespace Corvane::Wavemill

@@ -1,5 +1,7 @@
 #include "wavemill/tools/Tools.h"
 
+#include "tools/StandardNumbers.h"
+
 #include <algorithm>
 #include <cmath>
 #include <cstdint>
@@ -113,15 +115,8 @@ bool Tools::tryParse(const std::string &s, double &value) {
   }
   // Not swallowed on purpose: what the filter lets through but std::stod
   // cannot read ("-", ".", "1e999") reaches the caller as the standard
-  // exception. The texts are fixed here because callers show them and each
-  // standard library words them differently.
-  try {
-    value = std::stod(s);
-  } catch (const std::invalid_argument &) {
-    throw std::invalid_argument("invalid stod argument");
-  } catch (const std::out_of_range &) {
-    throw std::out_of_range("stod argument out of range");
-  }
+  // exception.
+  value = StandardNumbers::toDouble(s);
   return true;
 }
 

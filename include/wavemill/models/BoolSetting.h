@@ -9,6 +9,9 @@ namespace Corvane::Wavemill {
 /// any case and reads every other text as false.
 class WAVEMILL_API BoolSetting : public ValueSetting<bool> {
 public:
+  /// The converter set with setConverter; otherwise the enum converter for an
+  /// enum setting, else the shared OnOffConverter.
+  std::shared_ptr<IConverter> getConverter() const override;
   /// The flag word of a bool setting: 0x1A0FC.
   static constexpr ParameterBits BoolBits = static_cast<ParameterBits>(0x1A0FC);
 

@@ -11,6 +11,9 @@ namespace Corvane::Wavemill {
 /// Equality is exact, with no tolerance.
 class WAVEMILL_API DoubleSetting : public NumericSetting<double> {
 public:
+  /// The converter set with setConverter; otherwise the enum converter for an
+  /// enum setting, else the shared DoubleConverter.
+  std::shared_ptr<IConverter> getConverter() const override;
   DoubleSetting();
   explicit DoubleSetting(const char *name);
   DoubleSetting(const char *name, double value, double minimum, double maximum, double step);

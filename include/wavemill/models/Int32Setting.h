@@ -12,6 +12,9 @@ namespace Corvane::Wavemill {
 /// the list that getValidInt32Values returns.
 class WAVEMILL_API Int32Setting : public NumericSetting<int> {
 public:
+  /// The converter set with setConverter; otherwise the enum converter for an
+  /// enum setting, else the shared Int32Converter.
+  std::shared_ptr<IConverter> getConverter() const override;
   Int32Setting();
   explicit Int32Setting(const char *name);
   Int32Setting(const char *name, int value, int minimum, int maximum, int step);

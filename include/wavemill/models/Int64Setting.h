@@ -9,6 +9,9 @@ namespace Corvane::Wavemill {
 /// or more (no clipping then), otherwise v clipped to minimum and maximum.
 class WAVEMILL_API Int64Setting : public NumericSetting<std::int64_t> {
 public:
+  /// The converter set with setConverter; otherwise the enum converter for an
+  /// enum setting, else the shared Int64Converter.
+  std::shared_ptr<IConverter> getConverter() const override;
   Int64Setting();
   explicit Int64Setting(const char *name);
   Int64Setting(const char *name, std::int64_t value, std::int64_t minimum, std::int64_t maximum, std::int64_t step);

@@ -33,6 +33,12 @@ public:
   using SettingMap = std::unordered_map<std::string, std::uint64_t>;
   using Settings = std::vector<std::shared_ptr<Setting>>;
 
+  /// The metadata key of the list of stored settings a document lacked:
+  /// "MissingSettings".
+  static const std::string MissingSettings_key;
+  /// The metadata key of a class's name map on its prototype: "SettingMap".
+  static const std::string SettingMap_key;
+
   ModelBase();
   /// `typeName` may hold a namespace path with double colons.
   explicit ModelBase(const std::string &typeName);

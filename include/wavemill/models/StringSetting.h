@@ -11,6 +11,9 @@ namespace Corvane::Wavemill {
 /// A text setting. maxLength is advertised to displays and not enforced.
 class WAVEMILL_API StringSetting : public ValueSetting<std::string> {
 public:
+  /// The converter set with setConverter; otherwise the enum converter for an
+  /// enum setting, else the shared StringConverter.
+  std::shared_ptr<IConverter> getConverter() const override;
   /// The flag word of a string setting: 0x184FC.
   static constexpr ParameterBits StringBits = static_cast<ParameterBits>(0x184FC);
 
