@@ -196,7 +196,7 @@ public:
   /// Reads an array from the first "[" at or after `position`; `position`
   /// ends behind the closing "]" or at text.size(). An element is the
   /// first of: a quotation mark or a character from "+" to "9" other than
-  /// "," (a scalar), "{" or "[" ; everything else is passed over, so
+  /// "," (a scalar), "{" or "["; everything else is passed over, so
   /// `true` and `false` give no element. Since "]" doesn't end a scalar,
   /// `[1, 2]` on one line reads as `1` and `2]`. An element that runs into
   /// the end of the text without a stop character ends the array there,

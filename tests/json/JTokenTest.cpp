@@ -1,0 +1,246 @@
+#include "wavemill/json/JToken.h"
+
+#include <gtest/gtest.h>
+
+#include <memory>
+#include <random>
+#include <string>
+#include <vector>
+
+using namespace Corvane::Wavemill;
+
+namespace {
+
+std::shared_ptr<JValue> value(const std::string &name, const std::string &text) {
+  return std::make_shared<JValue>(name, text);
+}
+
+// A root with "$type", a nested object, an array and a scalar, added out of
+// order so that the writer has to sort.
+std::shared_ptr<JObject> makeExample() {
+  auto sub = std::make_shared<JObject>("Sub");
+  sub->addToken(value("Value", "1"));
+  sub->addToken(value("$type", "\"C\""));
+  auto values = std::make_shared<JArray>("Values");
+  values->addElement(value("", "1"));
+  values->addElement(value("", "2"));
+  auto root = std::make_shared<JObject>();
+  root->addToken(value("Z", "2"));
+  root->addToken(values);
+  root->addToken(sub);
+  root->addToken(value("$type", "\"A, B\""));
+  return root;
+}
+
+const char *const exampleText = "{\n"
+                                "  \"$type\": \"A, B\",\n"
+                                "  \"Sub\": {\n"
+                                "    \"$type\": \"C\",\n"
+                                "    \"Value\": 1  \n"
+                                "  }\n"
+                                ",\n"
+                                "  \"Values\": [\n"
+                                "    1,\n"
+                                "    2\n"
+                                "  ],\n"
+                                "  \"Z\": 2\n"
+                                "}\n";
+
+std::string read(const std::shared_ptr<JContainer> &object, const std::string &name) {
+  auto token = object->getItem(name);
+  return token ? token->toString() : "<missing>";
+}
+
+std::shared_ptr<JObject> parseObject(const std::string &text, int &position) {
+  auto object = std::make_shared<JObject>();
+  object->parse(text, position);
+  return object;
+}
+
+std::vector<std::string> elements(const JArray &array) {
+  std::vector<std::string> texts;
+  for (const auto &token : array.getTokens())
+    texts.push_back(token->toString());
+  return texts;
+}
+
+} // namespace
+
+TEST(JTokenTest, WriterPutsTypeFirstSortsMembersAndKeepsTheFixedLayout) {
+  EXPECT_EQ(makeExample()->toString(), exampleText);
+
+  // Byte order is unsigned, empty tokens are skipped, and an object without
+  // "$type" is written without that line and without a stray comma.
+  JObject object;
+  object.add("\xc3\xa9", value("", "3"));
+  object.add("a", value("", "1"));
+  object.add("Z", value("", "2"));
+  object.add("gone", nullptr);
+  EXPECT_EQ(object.toString(), "{\n  \"Z\": 2,\n  \"a\": 1,\n  \"\xc3\xa9\": 3\n}\n");
+  EXPECT_EQ(object.getItemNames(), (std::vector<std::string>{"\xc3\xa9", "a", "Z", "gone"}));
+
+  JArray empty;
+  std::string out;
+  empty.append(out, 4);
+  EXPECT_EQ(out, "[\n    ]");
+}
+
+TEST(JTokenTest, EscapingTouchesOnlyQuotedTextAndRawUndoesIt) {
+  EXPECT_EQ(JValue::toEscaped("\"a\tb\nc\rd\"e\\f'g\x01\xff\""), "\"a\\tb\\nc\\rd\\\"e\\\\f'g\x01\xff\"");
+  EXPECT_EQ(JValue::toEscaped("'a\"b'"), "'a\\\"b'");
+  for (const char *unchanged : {"12.5", "true", "\"", "\"a\tb'", "a\tb"})
+    EXPECT_EQ(JValue::toEscaped(unchanged), unchanged);
+
+  EXPECT_EQ(JValue::toRaw("\"a\\tb\\nc\\rd\\\"e\\\\f\\q\""), "\"a\tb\nc\rd\"e\\fq\"");
+  EXPECT_EQ(JValue::toRaw("\"a\\\""), "\"a\""); // the escaped end mark is taken as a character
+  for (const char *unchanged : {"\"\\\"", "\"a\"", "a\\tb", "\"a\\tb'"})
+    EXPECT_EQ(JValue::toRaw(unchanged), unchanged);
+}
+
+TEST(JTokenTest, ValueReaderCountsOnlyBlanksAsWhiteSpaceAndStopsWhereTheLayoutWants) {
+  struct Case {
+    const char *text;
+    int from;
+    const char *value;
+    int position;
+  };
+  const Case cases[] = {
+      {": \t1,", 0, "\t1", 5},       // TAB is part of the value
+      {"  5  , x", 0, "5", 5},       // a blank stops; position on the next non-blank
+      {"7\r\n", 0, "7", 1},          // a CR stays for the caller
+      {"8\n\n9", 0, "8", 3},         // LFs are skipped
+      {"9}", 0, "9", 1},             // the object reads its own "}"
+      {"\"a b\",", 0, "\"a b\"", 6}, // blanks inside the marks belong to the value
+      {"abc", 0, "a", 0},            // no stop character: first character only
+      {"x, 12 ", 2, "12", 2},        // nothing but blanks behind: position stays
+  };
+  for (const auto &c : cases) {
+    JValue token("", "old");
+    int position = c.from;
+    token.parse(c.text, position);
+    EXPECT_EQ(token.getValue(), c.value) << c.text;
+    EXPECT_EQ(position, c.position) << c.text;
+  }
+  JValue untouched("", "old");
+  int position = 0;
+  untouched.parse("   ", position);
+  EXPECT_EQ(untouched.getValue(), "old");
+}
+
+TEST(JTokenTest, ObjectReaderHandlesEmptyMissingAndValuelessObjects) {
+  int position = 1;
+  auto object = parseObject(" {} ", position);
+  EXPECT_TRUE(object->getItems().empty());
+  EXPECT_EQ(position, 3);
+
+  position = 0;
+  object = parseObject("\"a\": 1", position);
+  EXPECT_TRUE(object->getItems().empty());
+  EXPECT_EQ(position, 0);
+
+  position = 0;
+  object = parseObject("{\"a\"}", position);
+  EXPECT_FALSE(object->hasItem("a"));
+  EXPECT_EQ(position, 5);
+}
+
+TEST(JTokenTest, ObjectReaderTakesBareWordsTheWayItsScannerSeesThem) {
+  const std::string words = "{\"t\": true, \"n\": null, \"x\": nan}";
+  int position = 0;
+  auto object = parseObject(words, position);
+  EXPECT_EQ(read(object, "t"), "true");
+  EXPECT_EQ(read(object, "n"), ",");  // the scan passes `null` and starts at the comma
+  EXPECT_FALSE(object->hasItem("x")); // "}" comes before any value
+  EXPECT_EQ(position, static_cast<int>(words.size()));
+
+  position = 0;
+  object = parseObject("{\"a\": [true,\n1,\n\"x\"\n],\n\"b\": [1, 2]\n}", position);
+  auto a = std::dynamic_pointer_cast<JArray>(object->getItem("a"));
+  auto b = std::dynamic_pointer_cast<JArray>(object->getItem("b"));
+  ASSERT_TRUE(a && b);
+  EXPECT_EQ(elements(*a), (std::vector<std::string>{"1", "\"x\""}));
+  EXPECT_EQ(elements(*b), (std::vector<std::string>{"1", "2]"})); // "]" does not end a scalar
+}
+
+TEST(JTokenTest, ObjectReaderLetsNoBackslashProtectAMarkAndReplacesRepeatedNames) {
+  int position = 0;
+  auto object = parseObject("{\"a\": \"x\\\"y, z\", \"b\": 2}", position);
+  EXPECT_EQ(read(object, "a"), "\"x\\\"y");
+  EXPECT_FALSE(object->hasItem("b"));
+
+  position = 0;
+  object = parseObject("{\"a\": 1,\n\"b\": 3,\n\"a\": 2\n}", position);
+  EXPECT_EQ(read(object, "a"), "2");
+  EXPECT_EQ(object->getItems().size(), 2u);
+  EXPECT_EQ(object->getItemNames(), (std::vector<std::string>{"a", "b", "a"}));
+}
+
+TEST(JTokenTest, ReaderReadsTheWritersOutputBack) {
+  auto root = makeExample();
+  root->addToken(value("Text", "\"tab\there\nline\\slash\"q\""));
+  auto list = std::make_shared<JArray>("List");
+  auto inner = std::make_shared<JObject>();
+  inner->addToken(value("$type", "\"D\""));
+  inner->addToken(value("On", "false"));
+  list->addElement(inner);
+  list->addElement(value("", "\"s\""));
+  root->addToken(list);
+  const std::string text = root->toString();
+
+  int position = 0;
+  auto again = parseObject(text, position);
+  EXPECT_EQ(position, static_cast<int>(text.size()) - 1); // behind the "}", before the final LF
+  EXPECT_EQ(read(again, "Text"), "\"tab\there\nline\\slash\"q\"");
+  EXPECT_EQ(read(std::dynamic_pointer_cast<JObject>(again->getItem("Sub")), "Value"), "1");
+  EXPECT_EQ(again->toString(), text);
+
+  position = 0;
+  EXPECT_EQ(parseObject(exampleText, position)->toString(), exampleText);
+}
+
+// Hostile and damaged texts under the sanitizers: nothing may crash, hang or
+// read outside the text, and `position` only moves forward within it.
+TEST(JTokenTest, ReaderSurvivesDamagedTextsAndAnyPosition) {
+  std::mt19937 random(20261123);
+  const std::string document = makeExample()->toString();
+  const std::string alphabet = "{}[]\":, \r\n\t\\'tfnTF019.-+$a";
+
+  std::vector<std::string> texts = {"[1", "{\"a\": [1", "[ ", "[1\n", "[{", "{\"a\": {", "{\"a\": \"b", "{", ":"};
+  for (std::size_t length = 0; length <= document.size(); ++length)
+    texts.push_back(document.substr(0, length));
+  for (int round = 0; round < 3000; ++round) {
+    std::string text(random() % 120, '\0');
+    for (auto &c : text)
+      c = round % 2 ? static_cast<char>(random()) : alphabet[random() % alphabet.size()];
+    texts.push_back(text);
+  }
+
+  for (const auto &text : texts) {
+    const int size = static_cast<int>(text.size());
+    for (const int from : {0, static_cast<int>(random() % (text.size() + 2)), size, size + 5, -1, -1000}) {
+      const auto check = [&](JToken &token) {
+        int position = from;
+        token.parse(text, position);
+        if (from < 0 || from > size)
+          EXPECT_EQ(position, from) << text;
+        else
+          EXPECT_TRUE(position >= from && position <= size) << text;
+      };
+      JObject object;
+      JArray array;
+      JValue scalar("", "");
+      check(object);
+      check(array);
+      check(scalar);
+    }
+  }
+
+  // Nesting far beyond any model: the outer levels are read, the rest is not.
+  std::string deep;
+  for (int level = 0; level < 100000; ++level)
+    deep += "{\"a\": [";
+  int position = 0;
+  auto object = parseObject(deep, position);
+  EXPECT_TRUE(object->hasItem("a"));
+  EXPECT_EQ(position, static_cast<int>(deep.size()));
+}
