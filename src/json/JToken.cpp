@@ -281,9 +281,56 @@ void JContainer::append(std::string &out, int indent) const {
 
 JObject::JObject(std::string name) : JContainer(std::move(name)) {}
 
+namespace {
+
+std::size_t escapedSize(const std::string &text) {
+  std::size_t size = text.size();
+  if (!isQuoted(text.data(), size, 2))
+    return size;
+  for (std::size_t i = 1; i + 1 < text.size(); ++i) {
+    const char c = text[i];
+    size += (c == '\t' || c == '\n' || c == '\r' || c == '"' || c == '\\') ? 1 : 0;
+  }
+  return size;
+}
+
+// The exact length of what append() writes for `token` at `indent`, so that
+// a document is written into a string of its final size: growing a string of
+// megabytes step by step costs more than the whole walk.
+std::size_t textSize(const JToken &token, int indent) {
+  if (indent < 0)
+    indent = 0;
+  const auto blanks = static_cast<std::size_t>(indent);
+  if (const auto *value = dynamic_cast<const JValue *>(&token))
+    return escapedSize(value->getValue());
+  if (const auto *array = dynamic_cast<const JArray *>(&token)) {
+    std::size_t size = 2 + blanks + 1;
+    std::size_t count = 0;
+    for (const auto &element : array->getTokens())
+      if (element) {
+        size += blanks + 2 + textSize(*element, indent + 2);
+        ++count;
+      }
+    return size + (count == 0 ? 0 : 2 * count - 1);
+  }
+  if (const auto *container = dynamic_cast<const JContainer *>(&token)) {
+    std::size_t size = 2 + blanks + 1 + blanks + 2;
+    std::size_t count = 0;
+    for (const auto &item : container->getItems())
+      if (item.second) {
+        size += blanks + 2 + item.first.size() + 4 + textSize(*item.second, indent + 2);
+        ++count;
+      }
+    return size + (count == 0 ? 0 : 2 * (count - 1));
+  }
+  return 0;
+}
+
+} // namespace
+
 std::string JObject::toString() const {
   std::string result;
-  result.reserve(64 * (items.size() + 1));
+  result.reserve(textSize(*this, 0));
   append(result, 0);
   return result;
 }
@@ -341,6 +388,8 @@ void JObject::parseNested(const std::string &text, int &position, int depth) {
     // moves on. Members mostly come in ascending order, hence the hint.
     i = static_cast<std::size_t>(at);
     items.insert_or_assign(items.end(), name, std::move(token));
+    if (itemNames.empty())
+      itemNames.reserve(8); // one allocation for the members of a usual model
     itemNames.push_back(std::move(name));
 
     while (i < size && (s[i] == ' ' || s[i] == '\r' || s[i] == '\n' || s[i] == '\t'))

@@ -54,6 +54,7 @@ std::shared_ptr<JObject> JsonSerializer::serializeObject(std::shared_ptr<IModel>
 
 std::shared_ptr<JObject> JsonSerializer::doSerializeModel(std::shared_ptr<ModelBase> model) {
   auto object = std::make_shared<JObject>("");
+  object->reserve(model->getAllSettings().size());
   object->add(typeKey, std::make_shared<JValue>(typeKey, Tools::q(activator->toName(model))));
   const bool treeMode = setting && setting->getTreeMode();
   for (const auto &item : model->getAllSettings()) {
@@ -135,10 +136,11 @@ void JsonSerializer::doDeserializeModel(std::shared_ptr<ModelBase> model, std::s
   const bool treeMode = setting && setting->getTreeMode();
   if (!treeMode) {
     const bool tracking = setting && setting->getDeserializationTracking();
-    // The settings list is copied: a setting's parse may run couplings
-    // that are free to touch the model.
-    const ModelBase::Settings settings = model->getAllSettings();
-    for (const auto &item : settings) {
+    // Indexed, and each setting held while it is read: a setting's parse may
+    // run couplings that are free to touch the model.
+    const ModelBase::Settings &settings = model->getAllSettings();
+    for (std::size_t i = 0; i < settings.size(); ++i) {
+      const std::shared_ptr<Setting> item = settings[i];
       if (!item || !item->hasFlag(ParameterBits::Persisted))
         continue;
       auto token = object->getItem(item->getName());

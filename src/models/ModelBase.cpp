@@ -34,6 +34,7 @@ ModelBase::ModelBase() : ModelBase(std::string()) {}
 
 ModelBase::ModelBase(const std::string &typeName)
     : typeName(typeName), context(std::make_shared<ContextSetting>("Context")) {
+  settings.reserve(8); // room for a usual model's settings without regrowing
   settings.push_back(context);
 }
 

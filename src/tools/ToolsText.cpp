@@ -128,7 +128,14 @@ std::string Tools::toUpper(const std::string &s) {
   return result;
 }
 
-std::string Tools::q(const std::string &s) { return '"' + s + '"'; }
+std::string Tools::q(const std::string &s) {
+  std::string quoted;
+  quoted.reserve(s.size() + 2);
+  quoted += '"';
+  quoted += s;
+  quoted += '"';
+  return quoted;
+}
 
 std::string Tools::removeQuot(const std::string &s) {
   if (s.size() >= 2 && isQuote(s.front()) && isQuote(s.back())) {

@@ -2,6 +2,7 @@
 
 #include "wavemill/Export.h"
 
+#include <cstddef>
 #include <map>
 #include <memory>
 #include <string>
@@ -142,6 +143,9 @@ public:
   /// The names in the order they were added or read, with a name as often
   /// as it was added. The writer does not use it.
   const std::vector<std::string> &getItemNames() const { return itemNames; }
+  /// Makes room for the names of `count` members, for a writer that knows
+  /// how many it will add.
+  void reserve(std::size_t count) { itemNames.reserve(count); }
 
 protected:
   Items items;
