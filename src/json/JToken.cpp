@@ -328,6 +328,28 @@ std::size_t textSize(const JToken &token, int indent) {
 
 } // namespace
 
+namespace {
+
+// Where the members or elements of a container read from `position` begin:
+// behind the first `bracket` at or after it, or npos when there is nothing to
+// read. A container nested too deeply ends the whole read there.
+std::size_t openContainer(const std::string &text, int &position, char bracket, int depth) {
+  const std::size_t from = startOf(text, position);
+  const std::size_t size = text.size();
+  if (from == npos || from + 1 >= size)
+    return npos;
+  const std::size_t open = text.find(bracket, from);
+  if (open == npos)
+    return npos;
+  if (depth > maximumDepth) {
+    position = static_cast<int>(size);
+    return npos;
+  }
+  return open + 1;
+}
+
+} // namespace
+
 std::string JObject::toString() const {
   std::string result;
   result.reserve(textSize(*this, 0));
@@ -338,19 +360,11 @@ std::string JObject::toString() const {
 void JObject::parse(const std::string &text, int &position) { parseNested(text, position, 0); }
 
 void JObject::parseNested(const std::string &text, int &position, int depth) {
-  const std::size_t from = startOf(text, position);
   const std::size_t size = text.size();
-  if (from == npos || from + 1 >= size)
+  std::size_t i = openContainer(text, position, '{', depth);
+  if (i == npos)
     return;
-  const std::size_t open = text.find('{', from);
-  if (open == npos)
-    return;
-  if (depth > maximumDepth) {
-    position = static_cast<int>(size);
-    return;
-  }
   const char *s = text.data();
-  std::size_t i = open + 1;
   while (i < size) {
     if (s[i] == '}')
       break;
@@ -427,19 +441,11 @@ void JArray::parse(const std::string &text, int &position) { parseNested(text, p
 void JArray::addElement(std::shared_ptr<JToken> token) { tokens.push_back(std::move(token)); }
 
 void JArray::parseNested(const std::string &text, int &position, int depth) {
-  const std::size_t from = startOf(text, position);
   const std::size_t size = text.size();
-  if (from == npos || from + 1 >= size)
+  std::size_t i = openContainer(text, position, '[', depth);
+  if (i == npos)
     return;
-  const std::size_t open = text.find('[', from);
-  if (open == npos)
-    return;
-  if (depth > maximumDepth) {
-    position = static_cast<int>(size);
-    return;
-  }
   const char *s = text.data();
-  std::size_t i = open + 1;
   while (i < size) {
     if (s[i] == ']')
       break;
