@@ -38,6 +38,60 @@ std::size_t skipBlanks(const char *text, std::size_t size, std::size_t from) {
   return from;
 }
 
+bool isStop(char c) { return c == ' ' || c == ',' || c == '\r' || c == '\n' || c == '}'; }
+
+// The last search for a scalar's end during one read of a container. The
+// reader asks at ever later places of the same text; when a damaged text
+// has no stop character left, an uncached search would run to its end once
+// per member and make reading quadratic. Only reads of containers use it,
+// from the outermost call to its return, so it never outlives the text.
+struct StopSearch {
+  const char *text = nullptr;
+  std::size_t size = 0;
+  std::size_t from = 0;
+  std::size_t found = npos;
+  bool known = false;
+};
+thread_local StopSearch *activeSearch = nullptr;
+
+class StopSearchScope {
+public:
+  explicit StopSearchScope(const std::string &text) : outer(activeSearch) {
+    if (outer == nullptr) {
+      own.text = text.data();
+      own.size = text.size();
+      activeSearch = &own;
+    }
+  }
+  ~StopSearchScope() { activeSearch = outer; }
+  StopSearchScope(const StopSearchScope &) = delete;
+  StopSearchScope &operator=(const StopSearchScope &) = delete;
+
+private:
+  StopSearch *outer;
+  StopSearch own;
+};
+
+// The first stop character at or after `from`, or npos.
+std::size_t findStop(const char *text, std::size_t size, std::size_t from) {
+  StopSearch *search = activeSearch;
+  const bool cached = search != nullptr && search->text == text && search->size == size;
+  if (cached && search->known && from >= search->from && (search->found == npos || from <= search->found))
+    return search->found; // nothing stops between the last start and what it found
+  std::size_t found = npos;
+  for (std::size_t i = from; i < size; ++i)
+    if (isStop(text[i])) {
+      found = i;
+      break;
+    }
+  if (cached) {
+    search->from = from;
+    search->found = found;
+    search->known = true;
+  }
+  return found;
+}
+
 void appendBlanks(std::string &out, int count) {
   if (count > 0)
     out.append(static_cast<std::size_t>(count), ' ');
@@ -171,12 +225,10 @@ void JValue::parse(const std::string &text, int &position) {
     i = mark ? static_cast<std::size_t>(static_cast<const char *>(mark) - s) + 1 : size;
   }
   std::size_t end = start;
-  for (; i < size; ++i) {
-    const char c = s[i];
-    if (c == ' ' || c == ',' || c == '\r' || c == '\n' || c == '}') {
-      end = i;
-      break;
-    }
+  if (i < size) {
+    const std::size_t found = findStop(s, size, i);
+    if (found != npos)
+      end = found;
   }
 
   // The value is [start, stop) before trailing blanks are dropped.
@@ -364,6 +416,7 @@ void JObject::parseNested(const std::string &text, int &position, int depth) {
   std::size_t i = openContainer(text, position, '{', depth);
   if (i == npos)
     return;
+  const StopSearchScope search(text);
   const char *s = text.data();
   while (i < size) {
     if (s[i] == '}')
@@ -445,6 +498,7 @@ void JArray::parseNested(const std::string &text, int &position, int depth) {
   std::size_t i = openContainer(text, position, '[', depth);
   if (i == npos)
     return;
+  const StopSearchScope search(text);
   const char *s = text.data();
   while (i < size) {
     if (s[i] == ']')

@@ -244,3 +244,19 @@ TEST(JTokenTest, ReaderSurvivesDamagedTextsAndAnyPosition) {
   EXPECT_TRUE(object->hasItem("a"));
   EXPECT_EQ(position, static_cast<int>(deep.size()));
 }
+
+// A damaged text without any stop character: every scalar runs to the end of
+// the text, yet each member is read once and the read stays linear (this
+// text would take minutes if each member searched the rest of it again).
+TEST(JTokenTest, ReaderStaysLinearWithoutStopCharacters) {
+  std::string text = "{";
+  constexpr int members = 200000;
+  for (int n = 0; n < members; ++n)
+    text += "\"k" + std::to_string(n) + "\":1";
+  int position = 0;
+  auto object = parseObject(text, position);
+  EXPECT_EQ(object->getItems().size(), static_cast<std::size_t>(members));
+  ASSERT_TRUE(object->getItem("k123"));
+  EXPECT_EQ(object->getItem("k123")->toString(), "1");
+  EXPECT_EQ(position, static_cast<int>(text.size()));
+}
