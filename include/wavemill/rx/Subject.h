@@ -216,18 +216,48 @@ private:
 namespace subjects {
 
 /// A hot, synchronous subject. Copies share one set of observers.
+///
+/// The shared state is made when it is first asked for (a subscriber, an
+/// observable or a copy): most subjects, such as those of settings, are
+/// never observed, and a tree of thousands of models then makes none.
 template <class T> class subject {
 public:
-  subject() : state(std::make_shared<detail::subject_state<T>>()) {}
+  subject() = default;
+  subject(const subject &other) : state(other.shared()), raw(state.get()) {}
+  /// Not safe against a parallel use of this subject, as in RxCpp.
+  subject &operator=(const subject &other) {
+    if (this != &other) {
+      state = other.shared();
+      raw.store(state.get(), std::memory_order_release);
+    }
+    return *this;
+  }
 
-  subscriber<T> get_subscriber() const { return subscriber<T>(state); }
-  observable<T> get_observable() const { return observable<T>(state); }
+  subscriber<T> get_subscriber() const { return subscriber<T>(shared()); }
+  observable<T> get_observable() const { return observable<T>(shared()); }
 
   /// True when at least one observer is subscribed.
-  bool has_observers() const { return state->has_observers(); }
+  bool has_observers() const {
+    const auto *current = raw.load(std::memory_order_acquire);
+    return current != nullptr && current->has_observers();
+  }
 
 private:
-  std::shared_ptr<detail::subject_state<T>> state;
+  // The state, made once whichever thread asks first. After the first call
+  // a single atomic load stands between a caller and the state.
+  const std::shared_ptr<detail::subject_state<T>> &shared() const {
+    if (raw.load(std::memory_order_acquire) == nullptr)
+      std::call_once(made, [this] {
+        if (!state)
+          state = std::make_shared<detail::subject_state<T>>();
+        raw.store(state.get(), std::memory_order_release);
+      });
+    return state;
+  }
+
+  mutable std::once_flag made;
+  mutable std::shared_ptr<detail::subject_state<T>> state;
+  mutable std::atomic<detail::subject_state<T> *> raw{nullptr};
 };
 
 } // namespace subjects
