@@ -436,21 +436,8 @@ void JObject::parseNested(const std::string &text, int &position, int depth) {
       continue; // no value: nothing is stored
 
     std::string name(s + first + 1, second - first - 1);
-    std::shared_ptr<JToken> token;
     int at = static_cast<int>(i);
-    if (s[i] == '{') {
-      auto object = std::make_shared<JObject>(name);
-      object->parseNested(text, at, depth + 1);
-      token = std::move(object);
-    } else if (s[i] == '[') {
-      auto array = std::make_shared<JArray>(name);
-      array->parseNested(text, at, depth + 1);
-      token = std::move(array);
-    } else {
-      auto value = std::make_shared<JValue>(name, std::string());
-      value->parse(text, at);
-      token = std::move(value);
-    }
+    auto token = readToken(text, at, name, depth);
     // Every round ends behind the name's closing mark, so the loop always
     // moves on. Members mostly come in ascending order, hence the hint.
     i = static_cast<std::size_t>(at);
@@ -463,6 +450,23 @@ void JObject::parseNested(const std::string &text, int &position, int depth) {
       ++i;
   }
   position = static_cast<int>(i < size ? i + 1 : size);
+}
+
+std::shared_ptr<JToken> JObject::readToken(const std::string &text, int &position, std::string name, int depth) {
+  const char first = text[static_cast<std::size_t>(position)];
+  if (first == '{') {
+    auto object = std::make_shared<JObject>(std::move(name));
+    object->parseNested(text, position, depth + 1);
+    return object;
+  }
+  if (first == '[') {
+    auto array = std::make_shared<JArray>(std::move(name));
+    array->parseNested(text, position, depth + 1);
+    return array;
+  }
+  auto value = std::make_shared<JValue>(std::move(name), std::string());
+  value->parse(text, position);
+  return value;
 }
 
 // ---- JArray --------------------------------------------------------------------
@@ -511,19 +515,7 @@ void JArray::parseNested(const std::string &text, int &position, int depth) {
 
     const std::size_t begin = i;
     int at = static_cast<int>(i);
-    if (s[i] == '{') {
-      auto object = std::make_shared<JObject>(std::string());
-      object->parseNested(text, at, depth + 1);
-      tokens.push_back(std::move(object));
-    } else if (s[i] == '[') {
-      auto array = std::make_shared<JArray>(std::string());
-      array->parseNested(text, at, depth + 1);
-      tokens.push_back(std::move(array));
-    } else {
-      auto value = std::make_shared<JValue>(std::string(), std::string());
-      value->parse(text, at);
-      tokens.push_back(std::move(value));
-    }
+    tokens.push_back(JObject::readToken(text, at, std::string(), depth));
     // An element that did not move on has run into the end of the text: a
     // scalar with no stop character or only blanks or LFs behind it, or a
     // "{" or "[" as the last character. Scanning from the same place again

@@ -185,6 +185,9 @@ public:
 private:
   friend class JArray;
   void parseNested(const std::string &text, int &position, int depth);
+  // Reads the object, array or scalar that starts at `position` (one of
+  // "{", "[" or a scalar's first character) under the name `name`.
+  static std::shared_ptr<JToken> readToken(const std::string &text, int &position, std::string name, int depth);
 };
 
 /// A JSON array: the elements in order, each with an empty name. The
