@@ -1,7 +1,5 @@
 #pragma once
 
-#include "wavemill/Export.h"
-
 #include <string>
 
 namespace Corvane::Wavemill::Platform {
@@ -15,6 +13,6 @@ bool sendEcho(const std::string &ipv4, int timeoutInMS);
 
 // True when this process may open an ICMP socket at all: an unprivileged
 // datagram socket (allowed by the system's ping group range) or a raw socket.
-WAVEMILL_API bool canSendEcho();
+bool canSendEcho();
 
 } // namespace Corvane::Wavemill::Platform

@@ -1,7 +1,5 @@
 #pragma once
 
-#include "wavemill/Export.h"
-
 #include <cstddef>
 #include <string>
 
@@ -33,9 +31,9 @@ int processImagePath(int pid, std::size_t capacity, std::string &path);
 // and answers its handle, or null with the loader's message in `error`. The
 // library stays loaded to process exit: classes it registers must outlive
 // every model made from them.
-WAVEMILL_API void *loadModule(const std::string &path, std::string &error);
+void *loadModule(const std::string &path, std::string &error);
 
 // The address of the function `name` in the loaded library `module`, or null.
-WAVEMILL_API void *moduleSymbol(void *module, const char *name);
+void *moduleSymbol(void *module, const char *name);
 
 } // namespace Corvane::Wavemill::Platform

@@ -1,7 +1,5 @@
 #pragma once
 
-#include "wavemill/Export.h"
-
 #include <string>
 
 namespace Corvane::Wavemill::Platform {
@@ -19,6 +17,6 @@ bool startSockets();
 void stopSockets();
 
 // The references taken and not yet given back, for diagnostics.
-WAVEMILL_API int socketUsers();
+int socketUsers();
 
 } // namespace Corvane::Wavemill::Platform

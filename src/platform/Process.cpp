@@ -109,6 +109,64 @@ bool readStatFields(int pid, char &state, int &parent) {
   return true;
 }
 
+bool isBlank(char c) { return c == ' ' || c == '\t' || c == '\n'; }
+
+// The characters that a backslash escapes inside double quotes; before any
+// other the backslash stands for itself.
+bool escapableInDoubleQuotes(char c) { return c == '\\' || c == '"' || c == '$' || c == '`' || c == '\n'; }
+
+// Splits `line` into words the way a POSIX shell does before it expands
+// anything: blanks separate words, single quotes keep everything literal,
+// double quotes keep everything but the escapes above, a backslash outside
+// quotes takes the next character literally, and a backslash before a line
+// end joins the lines. Nothing is expanded: "$HOME", "*", ">" and "|" are
+// words or parts of words like any other. False when a quote is left open.
+bool splitCommandLine(const std::string &line, std::vector<std::string> &words) {
+  std::string word;
+  // '' and "" make a word of their own, empty as it is.
+  bool inWord = false;
+  for (std::size_t i = 0; i < line.size(); ++i) {
+    const char c = line[i];
+    if (isBlank(c)) {
+      if (inWord)
+        words.push_back(std::move(word));
+      word.clear();
+      inWord = false;
+    } else if (c == '\'') {
+      const auto end = line.find('\'', i + 1);
+      if (end == std::string::npos)
+        return false;
+      word.append(line, i + 1, end - i - 1);
+      i = end;
+      inWord = true;
+    } else if (c == '"') {
+      inWord = true;
+      for (++i; i < line.size() && line[i] != '"'; ++i) {
+        if (line[i] == '\\' && i + 1 < line.size() && escapableInDoubleQuotes(line[i + 1])) {
+          ++i;
+          if (line[i] == '\n')
+            continue; // a continued line leaves nothing behind
+        }
+        word += line[i];
+      }
+      if (i == line.size())
+        return false;
+    } else if (c == '\\' && i + 1 < line.size()) {
+      ++i;
+      if (line[i] != '\n') {
+        word += line[i];
+        inWord = true;
+      }
+    } else {
+      word += c;
+      inWord = true;
+    }
+  }
+  if (inWord)
+    words.push_back(std::move(word));
+  return true;
+}
+
 } // namespace
 
 int currentProcessId() { return static_cast<int>(::getpid()); }
@@ -162,6 +220,14 @@ bool terminateProcess(int pid) {
 }
 
 int spawnProcess(const std::string &commandLine, int &pid) {
+  std::vector<std::string> words;
+  if (!splitCommandLine(commandLine, words) || words.empty())
+    return EINVAL;
+  std::vector<char *> arguments;
+  for (auto &word : words)
+    arguments.push_back(word.data());
+  arguments.push_back(nullptr);
+
   children().reapAbandoned();
 
   // The child starts with default signal handling and nothing blocked, whatever
@@ -177,12 +243,11 @@ int spawnProcess(const std::string &commandLine, int &pid) {
   ::posix_spawnattr_setsigmask(&attributes, &none);
   ::posix_spawnattr_setflags(&attributes, POSIX_SPAWN_SETSIGDEF | POSIX_SPAWN_SETSIGMASK);
 
-  std::string shell = "sh";
-  std::string option = "-c";
-  std::string command = commandLine;
-  char *arguments[] = {shell.data(), option.data(), command.data(), nullptr};
+  // glibc hands the errno of a failed exec back from the child and reaps that
+  // child itself, so a program that cannot start is told apart from one that
+  // starts and fails, whatever its exit code.
   pid_t child = 0;
-  const int error = ::posix_spawn(&child, "/bin/sh", nullptr, &attributes, arguments, environ);
+  const int error = ::posix_spawnp(&child, arguments.front(), nullptr, &attributes, arguments.data(), environ);
   ::posix_spawnattr_destroy(&attributes);
   if (error != 0)
     return error;

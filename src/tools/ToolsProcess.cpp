@@ -5,21 +5,11 @@
 #include "platform/Network.h"
 #include "platform/Process.h"
 
-#include <cerrno>
 #include <regex>
 #include <sstream>
 #include <thread>
 
 namespace Corvane::Wavemill {
-
-namespace {
-
-// The shell answers for a command it cannot run with these exit codes; they
-// are the start failures that other systems report when creating the process.
-constexpr int shellNotFound = 127;
-constexpr int shellNotExecutable = 126;
-
-} // namespace
 
 int Tools::getCurrentProcessId() { return Platform::currentProcessId(); }
 
@@ -42,15 +32,12 @@ int Tools::startProcess(const std::string &commandLine, int timeoutInMS) {
   int pid = 0;
   if (const int error = Platform::spawnProcess(commandLine, pid); error != 0)
     return error;
+  // How the program ended is its own affair: it started, and that is all the
+  // result tells. One that outlasts the wait is reaped later, at the next start
+  // or when isRunning finds it ended.
   int exitStatus = 0;
-  if (!Platform::waitProcess(pid, timeoutInMS, exitStatus)) {
+  if (!Platform::waitProcess(pid, timeoutInMS, exitStatus))
     Platform::abandonProcess(pid);
-    return 0;
-  }
-  if (exitStatus == shellNotFound)
-    return ENOENT;
-  if (exitStatus == shellNotExecutable)
-    return EACCES;
   return 0;
 }
 

@@ -193,8 +193,14 @@ public:
   /// not used.
   static bool killProcess(int pid, int timeoutInMS);
   /// Starts `commandLine` and waits up to `timeoutInMS` (negative: without
-  /// limit) for its end. 0, also when it outlasts the wait, or the error
-  /// code of a failed start.
+  /// limit) for its end. 0 once the program started, whatever its exit code
+  /// and also when it outlasts the wait; the error code of a failed start
+  /// otherwise. The first word names the program, found through PATH when it
+  /// holds no "/"; the line is split into words by the quoting rules of a
+  /// POSIX shell, but nothing is expanded and no shell runs:
+  /// "tool 'a b' \"c\"" -> tool with "a b" and "c". On Linux the errors are
+  /// errno values: ENOENT (no such program), EACCES (not executable), EINVAL
+  /// (no word at all, or a quote left open).
   static int startProcess(const std::string &commandLine, int timeoutInMS);
   /// The parent of `pid` (negative: this process), or 0 when not found.
   static int getParentProcessId(int pid);
