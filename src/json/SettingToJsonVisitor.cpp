@@ -8,7 +8,8 @@
 #include "wavemill/models/StringSetting.h"
 #include "wavemill/tools/Tools.h"
 
-#include <cstdio>
+#include "tools/NumberText.h"
+
 #include <limits>
 
 namespace Corvane::Wavemill {
@@ -17,11 +18,7 @@ namespace {
 
 std::string numberText(std::int32_t value) { return std::to_string(value); }
 std::string numberText(std::int64_t value) { return std::to_string(value); }
-std::string numberText(double value) {
-  char buffer[40];
-  std::snprintf(buffer, sizeof buffer, "%.15g", value);
-  return buffer;
-}
+std::string numberText(double value) { return NumberText::formatDouble(value); }
 
 void addValue(JObject &object, const std::string &name, std::string text) {
   object.addToken(std::make_shared<JValue>(name, std::move(text)));

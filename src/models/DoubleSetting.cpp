@@ -4,9 +4,8 @@
 #include "wavemill/models/Prototype.h"
 #include "wavemill/models/SettingVisitor.h"
 
-#include <cerrno>
-#include <charconv>
-#include <cstdlib>
+#include "tools/NumberText.h"
+
 #include <limits>
 
 namespace Corvane::Wavemill {
@@ -17,22 +16,13 @@ DoubleSetting::DoubleSetting(const char *name)
 DoubleSetting::DoubleSetting(const char *name, double value, double minimum, double maximum, double step)
     : NumericSetting<double>(name, value, minimum, maximum, step) {}
 
-// The text of printf's "%.15g", written without the format parser: a
-// document of thousands of numbers spends much of its time here.
-std::string DoubleSetting::toString() const {
-  char text[32];
-  const auto written = std::to_chars(text, text + sizeof text, value, std::chars_format::general, 15);
-  return std::string(text, written.ptr);
-}
+std::string DoubleSetting::toString() const { return NumberText::formatDouble(value); }
 
 bool DoubleSetting::parse(const std::string &text) {
-  const char *begin = text.c_str();
-  char *end = nullptr;
-  errno = 0;
-  const double read = std::strtod(begin, &end);
-  if (end == begin || errno == ERANGE)
+  const auto read = NumberText::readDouble(text);
+  if (read.status != NumberText::ReadStatus::ok)
     return false;
-  value = read;
+  value = read.value;
   return true;
 }
 

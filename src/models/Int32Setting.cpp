@@ -4,9 +4,9 @@
 #include "wavemill/models/Prototype.h"
 #include "wavemill/models/SettingVisitor.h"
 
-#include <cerrno>
+#include "tools/NumberText.h"
+
 #include <climits>
-#include <cstdlib>
 
 namespace Corvane::Wavemill {
 
@@ -18,13 +18,10 @@ Int32Setting::Int32Setting(const char *name, int value, int minimum, int maximum
 std::string Int32Setting::toString() const { return std::to_string(value); }
 
 bool Int32Setting::parse(const std::string &text) {
-  const char *begin = text.c_str();
-  char *end = nullptr;
-  errno = 0;
-  const long long read = std::strtoll(begin, &end, 10);
-  if (end == begin || errno == ERANGE || read < INT_MIN || read > INT_MAX)
+  const auto read = NumberText::readInt32(text, 10);
+  if (read.status != NumberText::ReadStatus::ok)
     return false;
-  value = static_cast<int>(read);
+  value = read.value;
   return true;
 }
 

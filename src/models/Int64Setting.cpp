@@ -4,8 +4,8 @@
 #include "wavemill/models/Prototype.h"
 #include "wavemill/models/SettingVisitor.h"
 
-#include <cerrno>
-#include <cstdlib>
+#include "tools/NumberText.h"
+
 #include <limits>
 
 namespace Corvane::Wavemill {
@@ -20,13 +20,10 @@ Int64Setting::Int64Setting(const char *name, std::int64_t value, std::int64_t mi
 std::string Int64Setting::toString() const { return std::to_string(value); }
 
 bool Int64Setting::parse(const std::string &text) {
-  const char *begin = text.c_str();
-  char *end = nullptr;
-  errno = 0;
-  const long long read = std::strtoll(begin, &end, 10);
-  if (end == begin || errno == ERANGE)
+  const auto read = NumberText::readInt64(text, 10);
+  if (read.status != NumberText::ReadStatus::ok)
     return false;
-  value = read;
+  value = read.value;
   return true;
 }
 

@@ -1,5 +1,6 @@
 #include "wavemill/tools/Tools.h"
 
+#include "tools/NumberText.h"
 #include "tools/StandardNumbers.h"
 
 #include <algorithm>
@@ -11,14 +12,8 @@ namespace Corvane::Wavemill {
 
 namespace {
 
-template <typename T, typename Convert> T parseOr(const std::string &s, T defaultValue, Convert convert) {
-  try {
-    return convert(s);
-  } catch (const std::invalid_argument &) {
-    return defaultValue;
-  } catch (const std::out_of_range &) {
-    return defaultValue;
-  }
+template <typename T> T valueOr(const NumberText::Read<T> &read, T defaultValue) {
+  return read.status == NumberText::ReadStatus::ok ? read.value : defaultValue;
 }
 
 bool isDigit(char c) { return c >= '0' && c <= '9'; }
@@ -78,44 +73,38 @@ bool passesNumberFilter(const std::string &s) {
 // ---- Numbers from text ------------------------------------------------------
 
 int Tools::parseInt32(const std::string &s, int defaultValue) {
-  return parseOr(s, defaultValue, [](const std::string &text) { return std::stoi(text); });
+  return valueOr(NumberText::readInt32(s, 10), defaultValue);
 }
 
 std::int64_t Tools::parseInt64(const std::string &s, std::int64_t defaultValue) {
-  return parseOr(s, defaultValue, [](const std::string &text) { return std::int64_t{std::stoll(text)}; });
+  return valueOr(NumberText::readInt64(s, 10), defaultValue);
 }
 
 double Tools::parseDouble(const std::string &s, double defaultValue) {
-  return parseOr(s, defaultValue, [](const std::string &text) { return std::stod(text); });
+  return valueOr(NumberText::readDouble(s), defaultValue);
 }
 
 float Tools::parseFloat(const std::string &s, float defaultValue) {
-  return parseOr(s, defaultValue, [](const std::string &text) { return std::stof(text); });
+  return valueOr(NumberText::readFloat(s), defaultValue);
 }
 
 bool Tools::tryParse(const std::string &s, int &value, int base) {
-  // strtol rejects other bases without setting its end pointer, which
-  // std::stoi would then read uninitialised.
-  if (base != 0 && (base < 2 || base > 36)) {
+  // A base outside 0 and 2..36 reads nothing, as strtol does.
+  const auto read = NumberText::readInt32(s, base);
+  if (read.status != NumberText::ReadStatus::ok) {
     return false;
   }
-  try {
-    value = std::stoi(s, nullptr, base);
-    return true;
-  } catch (const std::invalid_argument &) {
-    return false;
-  } catch (const std::out_of_range &) {
-    return false;
-  }
+  value = read.value;
+  return true;
 }
 
 bool Tools::tryParse(const std::string &s, double &value) {
   if (s.empty() || !passesNumberFilter(s)) {
     return false;
   }
-  // Not swallowed on purpose: what the filter lets through but std::stod
-  // cannot read ("-", ".", "1e999") reaches the caller as the standard
-  // exception.
+  // Not swallowed on purpose: what the filter lets through but the
+  // conversion cannot read ("-", ".", "1e999") reaches the caller as the
+  // standard exception.
   value = StandardNumbers::toDouble(s);
   return true;
 }

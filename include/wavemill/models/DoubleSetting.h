@@ -18,9 +18,11 @@ public:
   explicit DoubleSetting(const char *name);
   DoubleSetting(const char *name, double value, double minimum, double maximum, double step);
 
-  /// printf "%.15g": 1e6 -> "1000000", 0.1 -> "0.1".
+  /// printf "%.15g" in the "C" locale, whatever locale the process has set:
+  /// 1e6 -> "1000000", 0.1 -> "0.1", never "0,1".
   std::string toString() const override;
-  /// Reads a number from the start of `text`; false, with the value
+  /// Reads a number from the start of `text` as strtod does in the "C"
+  /// locale ("2.5" is 2.5 under any locale); false, with the value
   /// unchanged, when there is none or it is out of range.
   bool parse(const std::string &text) override;
   double getDouble() const override;

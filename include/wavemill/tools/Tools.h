@@ -22,8 +22,9 @@ class OperationSystem;
 /// a default and functions that look for something answer with false, an
 /// empty text or -1, unless a function says otherwise. File and path
 /// functions use "/" inside; "\" in an input is turned into "/" first.
-/// All functions are reentrant; the wide conversions set the process's
-/// LC_CTYPE to the user's locale.
+/// Numbers are read and written in one form whatever locale the process has
+/// set: a decimal point, no grouping ("2.5", never "2,5"). All functions are
+/// reentrant, and none changes the process's or a thread's locale.
 class WAVEMILL_API Tools {
 public:
   Tools() = delete;
@@ -98,6 +99,7 @@ public:
   // ---- Numbers from text --------------------------------------------------
 
   /// The leading base-10 number of `s`, or `defaultValue`; never throws.
+  /// " 2.5V" -> 2.5 also under a locale with a decimal comma.
   static int parseInt32(const std::string &s, int defaultValue);
   static std::int64_t parseInt64(const std::string &s, std::int64_t defaultValue);
   static double parseDouble(const std::string &s, double defaultValue);
@@ -105,9 +107,9 @@ public:
   /// The leading number of `s` in `base`; false with `value` unchanged when
   /// there is none or it is out of range. Never throws.
   static bool tryParse(const std::string &s, int &value, int base);
-  /// False for text the number filter refuses; otherwise std::stod of the
-  /// whole text, whose std::invalid_argument or std::out_of_range pass
-  /// through (a lone sign or dot, an exponent of 999).
+  /// False for text the number filter refuses; otherwise the whole text read
+  /// as std::stod reads it in the "C" locale, whose std::invalid_argument or
+  /// std::out_of_range pass through (a lone sign or dot, an exponent of 999).
   static bool tryParse(const std::string &s, double &value);
 
   // ---- Numbers ------------------------------------------------------------
@@ -128,7 +130,9 @@ public:
 
   // ---- Wide text ----------------------------------------------------------
 
-  /// Narrow to wide in the user's locale (UTF-8 where none applies).
+  /// Narrow to wide in the character set of the user's locale, the one the
+  /// environment names (UTF-8 where that is the plain "C" locale). The
+  /// locale the application has set stays in force. Malformed text gives "".
   static std::wstring toWString(const std::string &s);
   static std::wstring toWString(const char *data, int count);
   /// Wide to narrow in the user's locale.

@@ -1,0 +1,177 @@
+#include "wavemill/json/ConverterBase.h"
+#include "wavemill/json/JsonSerializer.h"
+#include "wavemill/json/JsonToSettingVisitor.h"
+#include "wavemill/json/SettingToJsonVisitor.h"
+#include "wavemill/models/Activator.h"
+#include "wavemill/models/Prototype.h"
+#include "wavemill/tools/Tools.h"
+
+#include "tools/NumberText.h"
+#include "json/JsonTestModels.h"
+
+#include <gtest/gtest.h>
+
+#include <cerrno>
+#include <clocale>
+#include <cmath>
+#include <cstdlib>
+#include <string>
+#include <vector>
+
+using namespace Corvane::Wavemill;
+
+namespace {
+
+// Switches the whole process to `name` for the scope, as a desktop
+// application does with setlocale(LC_ALL, ""), and switches back also when
+// an assertion ends the test early.
+class ProcessLocale {
+public:
+  explicit ProcessLocale(const char *name) : previous(std::setlocale(LC_ALL, nullptr)) {
+    switched = std::setlocale(LC_ALL, name) != nullptr;
+  }
+  ~ProcessLocale() { std::setlocale(LC_ALL, previous.c_str()); }
+  ProcessLocale(const ProcessLocale &) = delete;
+  ProcessLocale &operator=(const ProcessLocale &) = delete;
+
+  bool switched = false;
+
+private:
+  std::string previous;
+};
+
+constexpr const char *german = "de_DE.UTF-8";
+constexpr const char *missing = "the locale de_DE.UTF-8 is missing; scripts/bootstrap generates it";
+
+} // namespace
+
+TEST(NumberTextTest, ReadsUnderADecimalCommaWhatStrtodReadsInTheCLocale) {
+  const char *const texts[] = {"12abc",  "  -3.5e2x", "0x1p3", "0x1p+-1", "0x.8",  "0xg",    "inf", "\t-Infinity",
+                               "nan(1)", ".",         "-",     "--1",     "1e999", "1e-310", "",    "+.5e+1x"};
+  struct Strtod {
+    double value;
+    std::ptrdiff_t length;
+    bool outOfRange;
+  };
+  std::vector<Strtod> expected;
+  {
+    const ProcessLocale plain("C");
+    for (const char *text : texts) {
+      char *end = nullptr;
+      errno = 0;
+      const double value = std::strtod(text, &end);
+      expected.push_back({value, end - text, errno == ERANGE});
+    }
+  }
+  const ProcessLocale locale(german);
+  ASSERT_TRUE(locale.switched) << missing;
+  for (std::size_t i = 0; i < expected.size(); ++i) {
+    SCOPED_TRACE(texts[i]);
+    const auto read = NumberText::readDouble(texts[i]);
+    EXPECT_EQ(static_cast<std::ptrdiff_t>(read.length), expected[i].length);
+    EXPECT_EQ(read.status == NumberText::ReadStatus::none, expected[i].length == 0);
+    EXPECT_EQ(read.status == NumberText::ReadStatus::outOfRange, expected[i].outOfRange);
+    if (read.status == NumberText::ReadStatus::ok) {
+      const bool bothNan = std::isnan(read.value) && std::isnan(expected[i].value);
+      EXPECT_TRUE(bothNan || read.value == expected[i].value) << read.value << " " << expected[i].value;
+    }
+  }
+
+  // Integers by strtoll's rules, base prefixes included.
+  const std::pair<const char *, int> integers[] = {{"0x1Fg", 0},
+                                                   {"077", 0},
+                                                   {" -12z", 10},
+                                                   {"zz", 36},
+                                                   {"0xg", 16},
+                                                   {"-9223372036854775808", 10},
+                                                   {"9223372036854775808", 10},
+                                                   {"+-1", 10}};
+  for (const auto &[text, base] : integers) {
+    SCOPED_TRACE(text);
+    char *end = nullptr;
+    errno = 0;
+    const long long value = std::strtoll(text, &end, base);
+    const bool outOfRange = errno == ERANGE;
+    const auto read = NumberText::readInt64(text, base);
+    EXPECT_EQ(static_cast<std::ptrdiff_t>(read.length), end - text);
+    EXPECT_EQ(read.status == NumberText::ReadStatus::outOfRange, outOfRange);
+    if (!outOfRange) {
+      EXPECT_EQ(read.value, value);
+    }
+  }
+}
+
+TEST(NumberTextTest, SettingsToolsConvertersAndDocumentsKeepTheDecimalPointUnderAGermanLocale) {
+  const ProcessLocale locale(german);
+  ASSERT_TRUE(locale.switched) << missing;
+  ASSERT_STREQ(std::localeconv()->decimal_point, ",") << "or nothing below is put to the test";
+
+  const auto parsed = [](const char *text) {
+    DoubleSetting setting("Level");
+    return setting.parse(text) ? setting.getDouble() : -99.0;
+  };
+  const auto tried = [](const char *text) {
+    double value = -99.0;
+    return Tools::tryParse(text, value) ? value : -99.0;
+  };
+  const auto converted = [](const char *text) {
+    DoubleSetting setting("Level");
+    Prototype::getInstance<DoubleConverter>()->convertBack(&setting, text);
+    return setting.getDouble();
+  };
+  const auto displayedMinimum = [](const char *object) {
+    DoubleSetting setting("Level");
+    JsonToSettingVisitor visitor(JsonSerializer::parse(object));
+    setting.visit(&visitor);
+    return setting.getMinimum();
+  };
+  const std::vector<double> array = Tools::parseDoubleArray("0.5, -1.25", ",");
+  struct Read {
+    const char *what;
+    double read;
+    double expected;
+  };
+  const Read reads[] = {
+      {"DoubleSetting::parse 2.5", parsed("2.5"), 2.5},
+      {"DoubleSetting::parse 1e-3", parsed("1e-3"), 1e-3},
+      {"DoubleSetting::parse -0.5", parsed("-0.5"), -0.5},
+      {"Tools::parseDouble", Tools::parseDouble(" 2.5V", 0), 2.5},
+      {"Tools::parseFloat", Tools::parseFloat("0.25", 0), 0.25},
+      {"Tools::tryParse", tried(" -1.5E-3"), -1.5e-3},
+      {"Tools::parseDoubleArray", array.size() == 2 ? array[0] + array[1] : -99.0, -0.75},
+      {"DoubleConverter::convertBack", converted("2.5"), 2.5},
+      {"display data Min", displayedMinimum(R"({"Value": 1, "Min": -0.25})"), -0.25},
+  };
+  for (const Read &row : reads) {
+    SCOPED_TRACE(row.what);
+    EXPECT_EQ(row.read, row.expected);
+  }
+
+  DoubleSetting half("Half", 0.5, -0.25, 2.5, 0.0);
+  SettingToJsonVisitor display;
+  half.visit(&display);
+  struct Written {
+    const char *what;
+    std::string text;
+    const char *expected;
+  };
+  const Written writes[] = {
+      {"DoubleSetting::toString", half.toString(), "0.5"},
+      {"display data Min", display.getCurrent()->getItem("Min")->toString(), "-0.25"},
+      {"display data Max", display.getCurrent()->getItem("Max")->toString(), "2.5"},
+  };
+  for (const Written &row : writes) {
+    SCOPED_TRACE(row.what);
+    EXPECT_EQ(row.text, row.expected);
+  }
+
+  JsonSerializer serializer;
+  serializer.getActivator()->registerType<JsonTests::Filter>("");
+  auto filter = std::make_shared<JsonTests::Filter>();
+  filter->cutoff->setValue(0.5);
+  const std::string document = serializer.serialize(filter);
+  EXPECT_NE(document.find("\"Cutoff\": 0.5,"), std::string::npos) << document;
+  const auto recalled = std::dynamic_pointer_cast<JsonTests::Filter>(serializer.deserialize(document));
+  ASSERT_NE(recalled, nullptr);
+  EXPECT_EQ(recalled->cutoff->getValue(), 0.5);
+}
