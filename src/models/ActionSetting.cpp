@@ -2,6 +2,9 @@
 
 namespace Corvane::Wavemill {
 
+// The flag words are part of saved documents and of applications' code.
+static_assert(static_cast<std::uint32_t>(ActionSetting::ActionBits) == 0x8300);
+
 ActionSetting::ActionSetting(const char *name) : ContextSetting(name, ActionBits) {}
 
 ActionSetting *ActionSetting::add(Handler handler) {

@@ -2,15 +2,14 @@
 
 #include "wavemill/models/ApplicationManager.h"
 
+#include "models/SavedNames.h"
+
 #include <algorithm>
 #include <stdexcept>
 
 namespace Corvane::Wavemill {
 
 namespace {
-
-const char *const collectionPrefix = "System.Collections.ObjectModel.Collection`1[[";
-const char *const collectionSuffix = "]], mscorlib";
 
 template <class Map> void prepare(Map &map) {
   map.max_load_factor(1.0f);
@@ -86,7 +85,7 @@ std::string Activator::getFullTypeName(std::shared_ptr<IModel> model) { return t
 
 std::string Activator::makeDotNetFullTypeName(std::shared_ptr<ICollection> collection) {
   auto item = collection ? collection->getItemPrototype() : nullptr;
-  return collectionPrefix + toName(item) + collectionSuffix;
+  return SavedNames::collectionName(toName(item));
 }
 
 void Activator::getShortTypeNamePosition(const std::string &name, std::size_t start, std::size_t count,
@@ -163,7 +162,7 @@ std::string Activator::updateFullTypeName(std::string assemblyName, std::string 
     updateFullTypeName(assemblyName, namespaceName, prototype->getItemPrototype());
     result = makeDotNetFullTypeName(std::dynamic_pointer_cast<ICollection>(prototype));
   } else {
-    result = namespaceName + "." + model->getTypeName() + ", " + assemblyName;
+    result = SavedNames::modelName(namespaceName, model->getTypeName(), assemblyName);
   }
   registerModel(prototype, result);
   return result;

@@ -8,6 +8,9 @@
 
 namespace Corvane::Wavemill {
 
+// The flag words are part of saved documents and of applications' code.
+static_assert(static_cast<std::uint32_t>(BoolSetting::BoolBits) == 0x1A0FC);
+
 BoolSetting::BoolSetting() : BoolSetting("", false) {}
 BoolSetting::BoolSetting(const char *name) : BoolSetting(name, false) {}
 BoolSetting::BoolSetting(const char *name, bool value) : ValueSetting<bool>(name ? name : "", value, BoolBits) {}

@@ -7,11 +7,15 @@
 #include "wavemill/models/Prototype.h"
 #include "wavemill/models/Setting.h"
 #include "wavemill/models/StringSetting.h"
+#include "wavemill/models/SubSetting.h"
 #include "wavemill/services/LogBase.h"
 
 #include <vector>
 
 namespace Corvane::Wavemill {
+
+// The flag words are part of saved documents and of applications' code.
+static_assert(static_cast<std::uint32_t>(SubSetting<ModelBase>::SubBits) == 0xF0);
 
 const std::string ModelBase::MissingSettings_key = "MissingSettings";
 const std::string ModelBase::SettingMap_key = "SettingMap";

@@ -4,6 +4,8 @@
 #include "wavemill/models/ModelBase.h"
 #include "wavemill/models/Setting.h"
 
+#include "models/SavedNames.h"
+
 namespace Corvane::Wavemill {
 
 void ModelContainer::add(std::shared_ptr<IModel> model, std::shared_ptr<RuntimeTypeBase> type) {
@@ -65,9 +67,9 @@ void ModelContainer::updateFullTypeName(std::string assemblyName, std::string na
     if (!item)
       return;
     updateFullTypeName(assemblyName, namespaceName, item);
-    text = "System.Collections.ObjectModel.Collection`1[[" + item->getFullTypeName() + "]]" + ", " + "mscorlib";
+    text = SavedNames::collectionName(item->getFullTypeName());
   } else {
-    text = namespaceName + "." + model->getTypeName() + ", " + assemblyName;
+    text = SavedNames::modelName(namespaceName, model->getTypeName(), assemblyName);
   }
   model->getMetadata().setText("FullTypeName", std::move(text));
 }

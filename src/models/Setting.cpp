@@ -5,10 +5,15 @@
 #include "wavemill/models/IModel.h"
 #include "wavemill/models/Interceptor.h"
 #include "wavemill/models/ModelBase.h"
+#include "wavemill/models/NumericSetting.h"
 #include "wavemill/models/Prototype.h"
 #include "wavemill/models/Transaction.h"
 
 namespace Corvane::Wavemill {
+
+// The flag words are part of saved documents and of applications' code.
+static_assert(static_cast<std::uint32_t>(Setting::DefaultBits) == 0x180FC);
+static_assert(static_cast<std::uint32_t>(NumericSetting<double>::NumericBits) == 0x188FC);
 
 Setting::Setting(std::string name, ParameterBits bits) : name(std::move(name)), parameterBits(bits) {}
 

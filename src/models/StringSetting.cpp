@@ -6,6 +6,9 @@
 
 namespace Corvane::Wavemill {
 
+// The flag words are part of saved documents and of applications' code.
+static_assert(static_cast<std::uint32_t>(StringSetting::StringBits) == 0x184FC);
+
 StringSetting::StringSetting() : StringSetting("", StringBits) {}
 StringSetting::StringSetting(const char *name) : StringSetting(name, StringBits) {}
 StringSetting::StringSetting(const char *name, const char *value)

@@ -44,6 +44,9 @@ void TextMap::setItem(const std::string &key, const std::string &value) {
 }
 
 void TextMap::onDeserialized() {
+  // A recall into a live tree rebuilds the index while other threads may
+  // look keys up.
+  std::lock_guard<std::mutex> lock(mutex);
   index.clear();
   auto collection = Items->getValue();
   if (!collection)

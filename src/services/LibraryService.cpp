@@ -3,17 +3,28 @@
 #include "wavemill/models/ModelContainer.h"
 #include "wavemill/models/Prototype.h"
 
+#include <typeindex>
+#include <typeinfo>
+
 namespace Corvane::Wavemill {
 
 std::vector<std::shared_ptr<Library>> LibraryService::getLibraries(bool reload) {
   if (libraries.empty() || reload) {
     nextIndex = 0;
     libraries.clear();
+    // The descriptors are keyed by type, in no useful order; the list of
+    // prototypes keeps the order in which the classes were registered, so
+    // a library's index tells when its first class appeared.
     auto container = Prototype::getInstance<ModelContainer>();
-    for (const auto &entry : container->getRuntimeTypes()) {
-      const auto &type = entry.second;
-      if (!type)
+    const auto &types = container->getRuntimeTypes();
+    for (const auto &model : container->getModels()) {
+      if (!model)
         continue;
+      const IModel &object = *model;
+      const auto found = types.find(std::type_index(typeid(object)));
+      if (found == types.end() || !found->second)
+        continue;
+      const auto &type = found->second;
       const std::string name = type->getLibraryName();
       auto &library = libraries[name];
       if (!library)

@@ -1,7 +1,5 @@
 #include "wavemill/services/Log.h"
 
-#include "wavemill/services/Stopwatch.h"
-
 #include <iostream>
 #include <utility>
 
@@ -28,12 +26,8 @@ Log::Log(std::string name) : LogBase(std::move(name)) {}
 Log::~Log() = default;
 
 void Log::write(int level, const std::string &text) {
-  if (getConsole()) {
-    std::string line = "[" + name + "]" + toString(level);
-    if (getTimeStamp())
-      line += "[" + Stopwatch::now(true) + "] ";
-    printLine(line + text);
-  }
+  if (getConsole())
+    printLine(LogMessage(name, level, text, getTimeStamp()).toString());
   LogBase::write(level, text);
 }
 

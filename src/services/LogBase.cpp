@@ -28,8 +28,15 @@ LogBase::~LogBase() = default;
 
 std::shared_ptr<LogBase> LogBase::get(const std::string &name) {
   static const std::shared_ptr<LogBase> root = Prototype::getInstance<LogBase>();
+  std::lock_guard<std::mutex> lock(root->channelsMutex);
   const auto found = root->channels.find(name);
   return found == root->channels.end() ? root : found->second;
+}
+
+void LogBase::addChannel(const std::shared_ptr<LogBase> &channel) {
+  auto root = Prototype::getInstance<LogBase>();
+  std::lock_guard<std::mutex> lock(root->channelsMutex);
+  root->channels[channel->getName()] = channel;
 }
 
 std::string LogBase::toString(int level) {

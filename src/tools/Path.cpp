@@ -4,6 +4,7 @@
 #include "wavemill/tools/Tools.h"
 
 #include "platform/FileSystem.h"
+#include "tools/Slashes.h"
 
 #include <algorithm>
 #include <atomic>
@@ -26,8 +27,6 @@ constexpr char productFolder[] = "Corvane/Lumenbay";
 
 // The classic limit of a path, terminating zero included.
 constexpr std::size_t maxPath = 260;
-
-std::string forwardSlashes(const std::string &path) { return Tools::replace(path, "\\", "/"); }
 
 // The full path with "/" only and without trailing separators; the root
 // keeps its one "/". Empty when the path cannot be resolved.

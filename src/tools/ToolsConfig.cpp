@@ -1,5 +1,7 @@
 #include "wavemill/tools/Tools.h"
 
+#include "tools/Slashes.h"
+
 #include <filesystem>
 #include <fstream>
 #include <iterator>
@@ -16,7 +18,7 @@ namespace {
 // Opens `path` for reading. A folder opens on this system but reads nothing
 // sensible (its end may even lie at the largest offset), so it does not count.
 bool openForReading(std::ifstream &stream, const std::string &path, std::ios::openmode mode) {
-  const auto file = Tools::replace(path, "\\", "/");
+  const auto file = forwardSlashes(path);
   std::error_code error;
   if (file.empty() || std::filesystem::is_directory(file, error)) {
     return false;
@@ -223,17 +225,17 @@ std::shared_ptr<std::vector<unsigned char>> Tools::readFile(const std::string &p
 }
 
 void Tools::writeText(const std::string &path, const std::string &text) {
-  std::ofstream stream(replace(path, "\\", "/"));
+  std::ofstream stream(forwardSlashes(path));
   stream << text;
 }
 
 void Tools::writeFile(const std::string &path, const std::vector<unsigned char> &data) {
-  std::ofstream stream(replace(path, "\\", "/"), std::ios::binary);
+  std::ofstream stream(forwardSlashes(path), std::ios::binary);
   stream.write(reinterpret_cast<const char *>(data.data()), static_cast<std::streamsize>(data.size()));
 }
 
 void Tools::openWrite(std::ofstream &stream, const std::string &path, std::int64_t size) {
-  const auto file = replace(path, "\\", "/");
+  const auto file = forwardSlashes(path);
   if (stream.is_open()) {
     stream.close();
   }

@@ -2,6 +2,7 @@
 #include "wavemill/tools/Tools.h"
 
 #include "platform/FileSystem.h"
+#include "tools/Slashes.h"
 
 #include <filesystem>
 #include <fstream>
@@ -15,8 +16,6 @@ namespace fs = std::filesystem;
 namespace Corvane::Wavemill {
 
 namespace {
-
-std::string forwardSlashes(const std::string &path) { return Tools::replace(path, "\\", "/"); }
 
 // A folder opens for reading on this system but not on Windows; it never
 // counts as a file here.

@@ -1,5 +1,7 @@
 #include "wavemill/tools/Tools.h"
 
+#include "tools/Slashes.h"
+
 #include <algorithm>
 #include <cctype>
 #include <cmath>
@@ -8,6 +10,7 @@
 #include <fstream>
 #include <limits>
 #include <stdexcept>
+#include <utility>
 
 #if defined(__SSE2__)
 #include <emmintrin.h>
@@ -120,7 +123,7 @@ void convert(const double *values, std::size_t count, double factor, unsigned ch
 } // namespace
 
 std::string Tools::getShortWaveformName(std::string name) {
-  std::replace(name.begin(), name.end(), '\\', '/');
+  name = forwardSlashes(std::move(name));
   if (const auto slash = name.rfind('/'); slash != std::string::npos)
     name.erase(0, slash + 1);
   std::replace(name.begin(), name.end(), ':', '_');

@@ -1,12 +1,23 @@
 #include "wavemill/tools/Tools.h"
 
-#include "platform/UserLocale.h"
-
-#include <cstddef>
+#include <clocale>
+#include <cstdlib>
+#include <cstring>
+#include <cwchar>
 
 namespace Corvane::Wavemill {
 
 namespace {
+
+constexpr std::size_t conversionFailed = static_cast<std::size_t>(-1);
+
+// The plain "C"/"POSIX" locale knows nothing beyond ASCII; where the user has
+// set no other, UTF-8 stands in so that text does not vanish.
+bool applyUserLocaleIsPlain() {
+  std::setlocale(LC_CTYPE, "");
+  const char *name = std::setlocale(LC_CTYPE, nullptr);
+  return name == nullptr || std::strcmp(name, "C") == 0 || std::strcmp(name, "POSIX") == 0;
+}
 
 bool isContinuation(unsigned char c) { return (c & 0xC0U) == 0x80U; }
 
@@ -107,19 +118,17 @@ std::string encodeUtf8(const wchar_t *data, std::size_t count) {
 
 } // namespace
 
-// The plain "C"/"POSIX" locale knows nothing beyond ASCII; where the user has
-// set no other, UTF-8 stands in so that text does not vanish.
 std::wstring Tools::toWString(const std::string &s) {
-  std::wstring wide;
-  switch (Platform::narrowToWideInUserLocale(s, wide)) {
-  case Platform::UserLocaleConversion::plain:
+  if (applyUserLocaleIsPlain()) {
     return decodeUtf8(s.data(), s.size());
-  case Platform::UserLocaleConversion::failed:
-    return std::wstring();
-  case Platform::UserLocaleConversion::done:
-    break;
   }
-  return wide;
+  // Each byte yields at most one wide character, so the input's length plus
+  // the terminator always suffices.
+  std::wstring buffer(s.size() + 1, L'\0');
+  if (std::mbstowcs(&buffer[0], s.c_str(), buffer.size()) == conversionFailed) {
+    return std::wstring();
+  }
+  return std::wstring(buffer.c_str());
 }
 
 std::wstring Tools::toWString(const char *data, int count) {
@@ -130,16 +139,17 @@ std::wstring Tools::toWString(const char *data, int count) {
 }
 
 std::string Tools::toString(const std::wstring &s) {
-  std::string narrow;
-  switch (Platform::wideToNarrowInUserLocale(s, narrow)) {
-  case Platform::UserLocaleConversion::plain:
+  if (applyUserLocaleIsPlain()) {
     return encodeUtf8(s.data(), s.size());
-  case Platform::UserLocaleConversion::failed:
-    return std::string();
-  case Platform::UserLocaleConversion::done:
-    break;
   }
-  return narrow;
+  // One wide character can take several bytes in a multibyte locale; a
+  // buffer of only the input's length would cut such a text short.
+  const auto perCharacter = static_cast<std::size_t>(MB_CUR_MAX);
+  std::string buffer(s.size() * perCharacter + 1, '\0');
+  if (std::wcstombs(&buffer[0], s.c_str(), buffer.size()) == conversionFailed) {
+    return std::string();
+  }
+  return std::string(buffer.c_str());
 }
 
 std::string Tools::toString(const wchar_t *data, int count) {

@@ -3,8 +3,14 @@
 
 #include "JsonTestModels.h"
 
+#include "wavemill/models/Couplings.h"
+#include "wavemill/models/Interceptor.h"
+
 #include <gtest/gtest.h>
 
+#include <atomic>
+#include <chrono>
+#include <future>
 #include <random>
 #include <stdexcept>
 #include <string>
@@ -36,6 +42,25 @@ std::string mutate(std::string text, std::mt19937 &random) {
     }
   }
   return text;
+}
+
+// What is wrong in a live tree: a setting not bound to `interceptor`, a model
+// whose owner is not the model that holds it, a hole in a collection.
+int faultsIn(const std::shared_ptr<IModel> &model, IModel *owner, Interceptor *interceptor) {
+  int faults = model->getOwner() != owner;
+  if (auto collection = std::dynamic_pointer_cast<ICollection>(model))
+    for (int i = 0; i < collection->getCount(); ++i) {
+      auto item = collection->getCommonItem(i);
+      faults += item ? faultsIn(item, model.get(), interceptor) : 1;
+    }
+  if (auto base = std::dynamic_pointer_cast<ModelBase>(model))
+    for (const auto &setting : base->getAllSettings()) {
+      faults += !setting || setting->getInterceptor() != interceptor;
+      if (setting && setting->isSubSetting())
+        if (auto held = setting->getCommonValue())
+          faults += faultsIn(held, model.get(), interceptor);
+    }
+  return faults;
 }
 
 } // namespace
@@ -94,4 +119,40 @@ TEST(JsonFuzzTest, DamagedDocumentsNeverBreakTheReader) {
     }
   }
   EXPECT_GT(trees, 1000); // mutations of real documents mostly still read
+}
+
+// Damaged documents recalled into a live tree under beginRecall leave it
+// live: every model stays bound and owned, the lock is free again, and a
+// write from another thread still runs the couplings.
+TEST(JsonFuzzTest, DamagedRecallIntoALiveTreeLeavesItUsable) {
+  JsonSerializer serializer;
+  serializer.getActivator()->updateFullTypeNames("Lab", "Corvane.Lab");
+  const std::string seed = serializer.serialize(JsonTests::makeBench());
+  auto live = JsonTests::makeBench();
+  Interceptor interceptor(live);
+  live->activateSettings(&interceptor, nullptr);
+  std::atomic<int> couplings{0};
+  live->setCouplings(std::make_shared<Couplings>([&](ModelBase *, Transaction *) { ++couplings; }));
+
+  std::mt19937 random(20261123);
+  for (int round = 0; round < 3000; ++round) {
+    const std::string text = round % 2 ? mutate(seed, random) : seed.substr(0, random() % (seed.size() + 1));
+    {
+      auto recall = live->beginRecall();
+      try {
+        serializer.deserializeToExistObject(JsonSerializer::parse(text), live);
+      } catch (const std::invalid_argument &) {
+        // Number conversions let the standard exceptions through.
+      } catch (const std::out_of_range &) {
+      }
+    }
+    if (round % 100 != 0)
+      continue;
+    SCOPED_TRACE(text);
+    ASSERT_EQ(faultsIn(live, nullptr, &interceptor), 0);
+    const int before = couplings.load();
+    auto write = std::async(std::launch::async, [&] { live->level->setValue(round % 7); });
+    ASSERT_EQ(write.wait_for(std::chrono::seconds(5)), std::future_status::ready) << "the tree stayed locked";
+    EXPECT_GT(couplings.load(), before);
+  }
 }

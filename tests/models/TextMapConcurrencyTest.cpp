@@ -1,3 +1,4 @@
+#include "wavemill/json/JsonSerializer.h"
 #include "wavemill/models/Interceptor.h"
 #include "wavemill/models/TextMap.h"
 
@@ -46,4 +47,36 @@ TEST(TextMapConcurrencyTest, ReadersAndWritersShareTheMap) {
     auto value = map->getItem("k" + std::to_string(key));
     EXPECT_TRUE(value == "v0" || value == "v1") << value;
   }
+}
+
+// A recall into the live map rebuilds the index while readers look keys up:
+// a reader never misses a key that is in the map before and after.
+TEST(TextMapConcurrencyTest, RecallRebuildsTheIndexWhileReadersLookUp) {
+  auto map = std::make_shared<TextMap>();
+  Interceptor interceptor(map);
+  map->activateSettings(&interceptor, nullptr);
+  constexpr int keys = 30;
+  for (int key = 0; key < keys; ++key)
+    map->setItem("k" + std::to_string(key), "v" + std::to_string(key));
+  JsonSerializer serializer;
+  serializer.getActivator()->registerType<TextMap>("");
+  const auto document = JsonSerializer::parse(serializer.serialize(map));
+
+  std::atomic<bool> recalling{true};
+  std::atomic<int> missed{0};
+  std::thread reader([&] {
+    while (recalling.load())
+      for (int key = 0; key < keys; ++key)
+        if (map->getItem("k" + std::to_string(key)) != "v" + std::to_string(key))
+          ++missed;
+  });
+  for (int round = 0; round < 200; ++round) {
+    auto recall = map->beginRecall();
+    serializer.deserializeToExistObject(document, map);
+  }
+  recalling = false;
+  reader.join();
+
+  EXPECT_EQ(missed.load(), 0);
+  EXPECT_EQ(map->getItem("k7"), "v7");
 }

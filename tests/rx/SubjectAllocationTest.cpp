@@ -49,13 +49,13 @@ void operator delete(void *memory, const std::nothrow_t &) noexcept { std::free(
 void operator delete[](void *memory, const std::nothrow_t &) noexcept { std::free(memory); }
 
 TEST(SubjectTest, OnNextAllocatesNothing) {
-  rxcpp::subjects::subject<std::string> subject;
+  Corvane::Wavemill::rx::subjects::subject<std::string> subject;
   const auto subscriber = subject.get_subscriber();
   const std::string value(100, 'x');                               // longer than any small-string buffer
   EXPECT_EQ(allocationsOf([&] { subscriber.on_next(value); }), 0); // nobody listens
 
   std::size_t received = 0;
-  std::vector<rxcpp::subscription> subscriptions(5);
+  std::vector<Corvane::Wavemill::rx::subscription> subscriptions(5);
   for (auto &each : subscriptions)
     each = subject.get_observable().subscribe([&](const std::string &text) { received += text.size(); });
   subscriptions[2].unsubscribe();

@@ -11,7 +11,7 @@
 // adding observers that end themselves from inside a delivery.
 TEST(SubjectConcurrencyTest, SteadyObserverGetsEveryValueOnceWhileOthersComeAndGo) {
   constexpr int publishers = 2, perPublisher = 5000;
-  rxcpp::subjects::subject<int> subject;
+  Corvane::Wavemill::rx::subjects::subject<int> subject;
   std::vector<std::atomic<int>> hits(publishers * perPublisher);
   // A publisher's values reach the steady observer on that publisher's
   // thread, so each slot of `expected` and `outOfOrder` has one writer.
@@ -46,7 +46,7 @@ TEST(SubjectConcurrencyTest, SteadyObserverGetsEveryValueOnceWhileOthersComeAndG
         // stored, so the handle is guarded.
         struct Handle {
           std::mutex mutex;
-          rxcpp::subscription subscription;
+          Corvane::Wavemill::rx::subscription subscription;
         };
         auto self = std::make_shared<Handle>();
         auto ending = observable.subscribe([&, self](int value) {

@@ -6,6 +6,7 @@
 #include <stdexcept>
 #include <string>
 #include <thread>
+#include <type_traits>
 
 namespace {
 
@@ -18,7 +19,7 @@ auto recordAs(Log &log, const std::string &who) {
 } // namespace
 
 TEST(SubjectTest, DeliversInSubscriptionOrderOnTheCallerThreadUntilUnsubscribed) {
-  rxcpp::subjects::subject<int> subject;
+  Corvane::Wavemill::rx::subjects::subject<int> subject;
   EXPECT_FALSE(subject.has_observers());
   Log log;
   std::thread::id thread;
@@ -44,16 +45,16 @@ TEST(SubjectTest, DeliversInSubscriptionOrderOnTheCallerThreadUntilUnsubscribed)
   subject.get_subscriber().on_next(3);
   EXPECT_EQ(log, (Log{"a1", "b1", "c1", "b2", "c2", "b3"}));
   EXPECT_TRUE(subject.has_observers());
-  const rxcpp::subscription none;
+  const Corvane::Wavemill::rx::subscription none;
   EXPECT_FALSE(none.is_subscribed());
   none.unsubscribe();
 }
 
 TEST(SubjectTest, SubscribingAndUnsubscribingDuringADeliveryTakeEffectAtOnce) {
-  rxcpp::subjects::subject<int> subject;
+  Corvane::Wavemill::rx::subjects::subject<int> subject;
   Log log;
-  std::optional<rxcpp::subscription> late;
-  rxcpp::subscription victim, self;
+  std::optional<Corvane::Wavemill::rx::subscription> late;
+  Corvane::Wavemill::rx::subscription victim, self;
   auto first = subject.get_observable().subscribe([&](int value) {
     log.push_back("first" + std::to_string(value));
     victim.unsubscribe();
@@ -77,7 +78,7 @@ TEST(SubjectTest, SubscribingAndUnsubscribingDuringADeliveryTakeEffectAtOnce) {
 }
 
 TEST(SubjectTest, ObserverMayPublishOnSameSubjectWhileBeingCalled) {
-  rxcpp::subjects::subject<int> subject;
+  Corvane::Wavemill::rx::subjects::subject<int> subject;
   Log log;
   const auto subscriber = subject.get_subscriber();
   auto countdown = subject.get_observable().subscribe([&](int value) {
@@ -92,7 +93,7 @@ TEST(SubjectTest, ObserverMayPublishOnSameSubjectWhileBeingCalled) {
 }
 
 TEST(SubjectTest, ObserverExceptionReachesPublisherAndSubjectStaysUsable) {
-  rxcpp::subjects::subject<int> subject;
+  Corvane::Wavemill::rx::subjects::subject<int> subject;
   Log log;
   auto before = subject.get_observable().subscribe(recordAs(log, "before"));
   auto thrower = subject.get_observable().subscribe([](int value) {
@@ -107,7 +108,7 @@ TEST(SubjectTest, ObserverExceptionReachesPublisherAndSubjectStaysUsable) {
 }
 
 TEST(SubjectTest, CompletionEndsEveryObserverAndLaterSubscriptions) {
-  rxcpp::subjects::subject<int> subject;
+  Corvane::Wavemill::rx::subjects::subject<int> subject;
   Log log;
   auto a = subject.get_observable().subscribe(recordAs(log, "a"));
   const auto subscriber = subject.get_subscriber();
@@ -129,10 +130,10 @@ TEST(SubjectTest, CallbacksAreReleasedAfterTheirLastCallAndNeverUnderTheLock) {
   // subscription can still end; a dropped subject takes its callbacks along.
   Log log;
   auto captured = std::make_shared<int>(0);
-  rxcpp::subscription subscription, orphan;
-  std::optional<rxcpp::subscriber<int>> subscriber;
+  Corvane::Wavemill::rx::subscription subscription, orphan;
+  std::optional<Corvane::Wavemill::rx::subscriber<int>> subscriber;
   {
-    rxcpp::subjects::subject<int> subject, dropped;
+    Corvane::Wavemill::rx::subjects::subject<int> subject, dropped;
     subscription = subject.get_observable().subscribe(recordAs(log, "a"));
     subscriber = subject.get_subscriber();
     orphan = dropped.get_observable().subscribe([captured](int) {});
@@ -147,7 +148,7 @@ TEST(SubjectTest, CallbacksAreReleasedAfterTheirLastCallAndNeverUnderTheLock) {
 
   // An ended subscription releases its callback at once: a kept handle makes
   // no cycle.
-  rxcpp::subjects::subject<int> subject;
+  Corvane::Wavemill::rx::subjects::subject<int> subject;
   auto plain = subject.get_observable().subscribe([captured](int) {});
   EXPECT_EQ(captured.use_count(), 2);
   plain.unsubscribe();
@@ -155,7 +156,7 @@ TEST(SubjectTest, CallbacksAreReleasedAfterTheirLastCallAndNeverUnderTheLock) {
 
   // A callback that ends itself still runs to its end on intact captures.
   auto counter = std::make_shared<int>(0);
-  rxcpp::subscription self;
+  Corvane::Wavemill::rx::subscription self;
   self = subject.get_observable().subscribe([&self, counter](int value) {
     self.unsubscribe();
     *counter += value;
@@ -167,7 +168,8 @@ TEST(SubjectTest, CallbacksAreReleasedAfterTheirLastCallAndNeverUnderTheLock) {
 
   // A callback whose destruction ends another subscription of the same
   // subject: released outside the subject's lock, so this does not hang.
-  auto other = std::make_shared<rxcpp::subscription>(subject.get_observable().subscribe(recordAs(log, "other")));
+  auto other =
+      std::make_shared<Corvane::Wavemill::rx::subscription>(subject.get_observable().subscribe(recordAs(log, "other")));
   std::shared_ptr<void> endsOther(nullptr, [other](void *) { other->unsubscribe(); });
   auto owner = subject.get_observable().subscribe([endsOther](int) {});
   endsOther.reset();
@@ -175,4 +177,24 @@ TEST(SubjectTest, CallbacksAreReleasedAfterTheirLastCallAndNeverUnderTheLock) {
   EXPECT_FALSE(other->is_subscribed());
   subject.get_subscriber().on_next(1);
   EXPECT_EQ(log, (Log{"a1"}));
+}
+
+// Stand-ins for the real RxCpp's names: an application that includes both
+// must get two sets of classes, not redefinitions.
+namespace rxcpp {
+class subscription {};
+namespace subjects {
+template <class T> class subject {};
+} // namespace subjects
+} // namespace rxcpp
+
+TEST(SubjectTest, LivesBesideRxCppInAnApplication) {
+  static_assert(!std::is_same_v<rxcpp::subscription, Corvane::Wavemill::rx::subscription>);
+  rxcpp::subjects::subject<int> theirs;
+  Corvane::Wavemill::rx::subjects::subject<int> ours;
+  int received = 0;
+  auto subscription = ours.get_observable().subscribe([&](int value) { received = value; });
+  ours.get_subscriber().on_next(3);
+  EXPECT_EQ(received, 3);
+  (void)theirs;
 }

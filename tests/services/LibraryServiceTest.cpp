@@ -57,15 +57,12 @@ TEST(LibraryServiceTest, ModulesListTheirClasses) {
   EXPECT_EQ(typeNames(*find(libraries, "wavemill_services_tests")), (std::vector<std::string>{"Gauge", "Probe"}));
   EXPECT_EQ(find(libraries, "wavemill")->toString(), "wavemill");
 
-  // By ascending name; the index counts first appearance.
+  // By ascending name; the index counts first appearance in registration
+  // order: the library registers while it loads, before the program does.
   auto names = service.getNames();
   EXPECT_TRUE(std::is_sorted(names.begin(), names.end()));
-  std::vector<std::uint64_t> indices;
-  for (const auto &library : libraries)
-    indices.push_back(library->getIndex());
-  std::sort(indices.begin(), indices.end());
-  for (std::size_t i = 0; i < indices.size(); ++i)
-    EXPECT_EQ(indices[i], i);
+  EXPECT_EQ(find(libraries, "wavemill")->getIndex(), 0U);
+  EXPECT_EQ(find(libraries, "wavemill_services_tests")->getIndex(), 1U);
 
   std::string error;
   ASSERT_TRUE(Platform::loadModule(WAVEMILL_TEST_PLUGIN, error)) << error;
@@ -75,6 +72,7 @@ TEST(LibraryServiceTest, ModulesListTheirClasses) {
   EXPECT_EQ(service.getMap().size(), libraries.size());
   auto plugin = find(service.getLibraries(true), "wavemill_test_plugin");
   ASSERT_TRUE(plugin);
+  EXPECT_EQ(plugin->getIndex(), libraries.size());
   EXPECT_EQ(typeNames(*plugin), (std::vector<std::string>{"Marker", "Sweep"}));
 
   EXPECT_FALSE(activator.toInstance("Plugins.Sweep"));

@@ -19,7 +19,7 @@ struct LineProbe {
   ~LineProbe() { subscription.unsubscribe(); }
   std::vector<std::string> lines;
   std::vector<bool> stamped;
-  rxcpp::subscription subscription;
+  Corvane::Wavemill::rx::subscription subscription;
 };
 
 struct AuditLog : Log {

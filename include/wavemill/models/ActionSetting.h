@@ -17,7 +17,8 @@ public:
   using Handler = std::function<void(ActionSetting *)>;
 
   /// The flag word of an action setting: 0x8300.
-  static constexpr ParameterBits ActionBits = static_cast<ParameterBits>(0x8300);
+  static constexpr ParameterBits ActionBits =
+      ParameterBits::PlainSettingMark | ParameterBits::ContextKind | ParameterBits::ActionKind;
 
   explicit ActionSetting(const char *name = "");
 

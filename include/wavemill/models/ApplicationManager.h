@@ -50,7 +50,7 @@ public:
   const std::shared_ptr<BoolSetting> Busy;
   /// Every finished change of the tree, after all couplings ran, on the
   /// writer's thread and inside the tree's lock.
-  rxcpp::subjects::subject<Transaction *> transactions;
+  rx::subjects::subject<Transaction *> transactions;
 };
 
 extern template class ModelCollection<ApplicationBase>;

@@ -13,7 +13,7 @@ public:
   /// enum setting, else the shared OnOffConverter.
   std::shared_ptr<IConverter> getConverter() const override;
   /// The flag word of a bool setting: 0x1A0FC.
-  static constexpr ParameterBits BoolBits = static_cast<ParameterBits>(0x1A0FC);
+  static constexpr ParameterBits BoolBits = DefaultBits | ParameterBits::BoolKind;
 
   BoolSetting();
   explicit BoolSetting(const char *name);

@@ -11,7 +11,7 @@ namespace Corvane::Wavemill {
 class WAVEMILL_API ContextSetting : public StringSetting {
 public:
   /// The flag word of a context setting: 0x8100.
-  static constexpr ParameterBits ContextBits = static_cast<ParameterBits>(0x8100);
+  static constexpr ParameterBits ContextBits = ParameterBits::PlainSettingMark | ParameterBits::ContextKind;
 
   explicit ContextSetting(const char *name = "");
 

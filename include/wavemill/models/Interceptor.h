@@ -56,7 +56,7 @@ public:
 
   /// Settings with PublishChange publish themselves here when their value
   /// changed. Subscribers run on the writer's thread, inside the lock.
-  rxcpp::subjects::subject<ISetting *> &getSubject() { return subject; }
+  rx::subjects::subject<ISetting *> &getSubject() { return subject; }
 
   const std::shared_ptr<IModel> &getRoot() const { return root; }
   /// Sets the root model, which must be a ModelBase to be coupled; the
@@ -87,7 +87,7 @@ private:
   // takes its place so that the pointer never dangles.
   void abandon(const Transaction *transaction);
 
-  rxcpp::subjects::subject<ISetting *> subject;
+  rx::subjects::subject<ISetting *> subject;
   std::shared_ptr<IModel> root;
   ModelBase *rootModel = nullptr;
   std::mutex mutex;

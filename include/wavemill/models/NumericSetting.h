@@ -13,7 +13,7 @@ namespace Corvane::Wavemill {
 template <class T> class WAVEMILL_API NumericSetting : public ValueSetting<T> {
 public:
   /// The flag word of the numeric settings: 0x188FC.
-  static constexpr ParameterBits NumericBits = static_cast<ParameterBits>(0x188FC);
+  static constexpr ParameterBits NumericBits = Setting::DefaultBits | ParameterBits::NumericKind;
 
   NumericSetting(const char *name, T value, T minimum, T maximum, T step)
       : ValueSetting<T>(name ? name : "", value, NumericBits), minimum(minimum), maximum(maximum), step(step),

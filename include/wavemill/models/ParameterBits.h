@@ -6,17 +6,22 @@ namespace Corvane::Wavemill {
 
 /// The flag word of a setting. The bits are both state, kept in the word,
 /// and change codes, handed to onPropertyChanged when that property changed.
-/// The bits 0x4, 0x20 and 0x80 are set in the defaults and left to
-/// applications.
 enum class ParameterBits : std::uint32_t {
   None = 0,
   /// setValue refuses to change the value.
   ReadOnly = 0x1,
+  /// Set in the defaults and not interpreted by the library: free for
+  /// applications.
+  ApplicationFlag1 = 0x4,
   Visible = 0x8,
   /// The JSON writer stores the setting.
   Persisted = 0x10,
+  /// Set in the defaults and not interpreted by the library.
+  ApplicationFlag2 = 0x20,
   /// reset() restores the default value.
   Resettable = 0x40,
+  /// Set in the defaults and not interpreted by the library.
+  ApplicationFlag3 = 0x80,
   ContextKind = 0x100,
   ActionKind = 0x200,
   StringKind = 0x400,
@@ -35,10 +40,17 @@ enum class ParameterBits : std::uint32_t {
   /// Only on sub-model holders: the held model is referenced weakly.
   WeakSubValue = 0x800000,
   /// The kinds that carry a value.
-  ValueKinds = 0x3D00,
+  ValueKinds = ContextKind | StringKind | NumericKind | EnumKind | BoolKind,
   /// The kinds whose value the JSON writer quotes.
-  QuotedKinds = 0x1400,
+  QuotedKinds = StringKind | EnumKind,
+  /// What every setting of the library carries in its flag word from the
+  /// start: the three application flags, Visible, Persisted and Resettable.
+  CommonFlags = ApplicationFlag1 | Visible | Persisted | ApplicationFlag2 | Resettable | ApplicationFlag3,
 };
+
+static_assert(static_cast<std::uint32_t>(ParameterBits::ValueKinds) == 0x3D00);
+static_assert(static_cast<std::uint32_t>(ParameterBits::QuotedKinds) == 0x1400);
+static_assert(static_cast<std::uint32_t>(ParameterBits::CommonFlags) == 0xFC);
 
 constexpr ParameterBits operator|(ParameterBits a, ParameterBits b) {
   return static_cast<ParameterBits>(static_cast<std::uint32_t>(a) | static_cast<std::uint32_t>(b));

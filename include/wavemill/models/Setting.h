@@ -27,7 +27,8 @@ class SettingVisitor;
 class WAVEMILL_API Setting : public ISetting {
 public:
   /// The flag word of a plain setting: 0x180FC.
-  static constexpr ParameterBits DefaultBits = static_cast<ParameterBits>(0x180FC);
+  static constexpr ParameterBits DefaultBits =
+      ParameterBits::CommonFlags | ParameterBits::PlainSettingMark | ParameterBits::PublishChange;
 
   explicit Setting(std::string name = {}, ParameterBits bits = DefaultBits);
   ~Setting() override;
@@ -97,7 +98,7 @@ public:
 
   /// The subject on which the setting publishes its changes. Subscribers
   /// run on the writer's thread, inside the tree's lock.
-  rxcpp::subjects::subject<SettingChange> &getSubject() { return subject; }
+  rx::subjects::subject<SettingChange> &getSubject() { return subject; }
 
   const std::string &getAuxiliaryText() const { return auxiliaryText; }
   void setAuxiliaryText(std::string text) { auxiliaryText = std::move(text); }
@@ -130,7 +131,7 @@ protected:
 
   IModel *owner = nullptr;
   Interceptor *interceptor = nullptr;
-  rxcpp::subjects::subject<SettingChange> subject;
+  rx::subjects::subject<SettingChange> subject;
   const std::string name;
   std::string auxiliaryText;
   std::shared_ptr<IConverter> converter;

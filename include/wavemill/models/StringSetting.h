@@ -15,7 +15,7 @@ public:
   /// enum setting, else the shared StringConverter.
   std::shared_ptr<IConverter> getConverter() const override;
   /// The flag word of a string setting: 0x184FC.
-  static constexpr ParameterBits StringBits = static_cast<ParameterBits>(0x184FC);
+  static constexpr ParameterBits StringBits = DefaultBits | ParameterBits::StringKind;
 
   StringSetting();
   explicit StringSetting(const char *name);

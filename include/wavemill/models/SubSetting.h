@@ -23,7 +23,8 @@ namespace Corvane::Wavemill {
 template <class T> class WAVEMILL_API SubSetting : public Setting {
 public:
   /// The flag word of a sub-model holder: 0xF0.
-  static constexpr ParameterBits SubBits = static_cast<ParameterBits>(0xF0);
+  static constexpr ParameterBits SubBits = ParameterBits::Persisted | ParameterBits::ApplicationFlag2 |
+                                           ParameterBits::Resettable | ParameterBits::ApplicationFlag3;
 
   /// A holder of a new, default-constructed T.
   explicit SubSetting(const char *name = "") : SubSetting(name, std::make_shared<T>()) {}

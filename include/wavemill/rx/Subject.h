@@ -2,8 +2,8 @@
 
 // A small synchronous reactive layer with the names and meaning of RxCpp for
 // the subset the library uses: a subject, its subscriber, its observable and
-// the subscription that subscribe() returns. It is self-contained so that a
-// build against the real RxCpp can replace this header.
+// the subscription that subscribe() returns. It lives in the library's own
+// namespace, so an application may use the real RxCpp beside it.
 
 #include <atomic>
 #include <cstddef>
@@ -13,7 +13,7 @@
 #include <utility>
 #include <vector>
 
-namespace rxcpp {
+namespace Corvane::Wavemill::rx {
 
 namespace detail {
 
@@ -261,4 +261,4 @@ private:
 };
 
 } // namespace subjects
-} // namespace rxcpp
+} // namespace Corvane::Wavemill::rx

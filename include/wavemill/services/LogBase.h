@@ -8,6 +8,7 @@
 
 #include <atomic>
 #include <memory>
+#include <mutex>
 #include <string>
 #include <unordered_map>
 
@@ -59,7 +60,7 @@ public:
   public:
     Creator() {
       std::shared_ptr<LogBase> channel = Prototype::getInstance<T>();
-      Prototype::getInstance<LogBase>()->channels[channel->getName()] = channel;
+      addChannel(channel);
     }
   };
 
@@ -86,7 +87,7 @@ public:
 
   /// The subject on which the channel publishes; subscribe to its
   /// get_observable() to receive the channel's records.
-  rxcpp::subjects::subject<LogMessage *> &getSubject() { return subject; }
+  rx::subjects::subject<LogMessage *> &getSubject() { return subject; }
   /// The name under which the channel is registered.
   const std::string &getName() const { return name; }
   /// With true, the lines of this channel show the local time. Off at start.
@@ -98,7 +99,7 @@ public:
   bool getConsole() const { return console.load(std::memory_order_relaxed); }
 
 protected:
-  rxcpp::subjects::subject<LogMessage *> subject;
+  rx::subjects::subject<LogMessage *> subject;
   const std::string name;
   // Atomic because an application may switch them while other threads log.
   std::atomic<bool> timeStamp{false};
@@ -109,8 +110,13 @@ private:
   // subclass that overrides one is not entered twice by the other.
   void publish(LogMessage *message);
 
-  // Used only by the shared instance, as the process's table of channels.
+  static void addChannel(const std::shared_ptr<LogBase> &channel);
+
+  // Used only by the shared instance, as the process's table of channels. A
+  // module loaded at run time adds its channels while other threads log, so
+  // the table has a lock of its own.
   std::unordered_map<std::string, std::shared_ptr<LogBase>> channels;
+  std::mutex channelsMutex;
 };
 
 } // namespace Corvane::Wavemill

@@ -24,7 +24,8 @@ class OperationSystem;
 /// functions use "/" inside; "\" in an input is turned into "/" first.
 /// Numbers are read and written in one form whatever locale the process has
 /// set: a decimal point, no grouping ("2.5", never "2,5"). All functions are
-/// reentrant, and none changes the process's or a thread's locale.
+/// reentrant; the wide conversions set the process's LC_CTYPE to the user's
+/// locale (numbers do not depend on it).
 class WAVEMILL_API Tools {
 public:
   Tools() = delete;
@@ -130,9 +131,9 @@ public:
 
   // ---- Wide text ----------------------------------------------------------
 
-  /// Narrow to wide in the character set of the user's locale, the one the
-  /// environment names (UTF-8 where that is the plain "C" locale). The
-  /// locale the application has set stays in force. Malformed text gives "".
+  /// Narrow to wide in the user's locale (UTF-8 where none applies); sets
+  /// the process's LC_CTYPE to that locale, a change that stays in force.
+  /// Malformed text gives "".
   static std::wstring toWString(const std::string &s);
   static std::wstring toWString(const char *data, int count);
   /// Wide to narrow in the user's locale.
