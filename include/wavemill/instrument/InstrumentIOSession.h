@@ -22,6 +22,7 @@ namespace Corvane::Wavemill {
 /// on a live connection is the transport's to report (see each class).
 class WAVEMILL_API InstrumentIOSession {
 public:
+  /// Does nothing; a session touches the network only in connect().
   InstrumentIOSession();
   virtual ~InstrumentIOSession();
   InstrumentIOSession(const InstrumentIOSession &) = delete;
@@ -33,6 +34,7 @@ public:
   virtual bool getConnected() const = 0;
   /// Time-out of each transfer, in milliseconds.
   virtual int getTimeoutInMS() = 0;
+  /// Sets the time-out, in milliseconds, for the transfers to come.
   virtual void setTimeoutInMS(int timeoutInMS) = 0;
   /// Opens the transport; true if connected afterwards.
   virtual bool connect() = 0;
@@ -42,6 +44,7 @@ public:
   virtual void close() = 0;
   /// The terminator sent after lines and blocks.
   virtual std::string getBlockEnd() const = 0;
+  /// Sets the terminator, where the transport lets it be chosen.
   virtual void setBlockEnd(std::string blockEnd) = 0;
   /// Sends one command line with its terminator.
   virtual void writeLine(const std::string &text) = 0;
@@ -62,11 +65,17 @@ public:
   /// Sends the terminator that closes the block.
   virtual void writeManyBlocksEnd() = 0;
 
-  /// writeLine(command), then readLine(). No lock, no retry.
-  std::string query(const std::string &command);
+  // query and queryArray are virtual so that every implementation shares
+  // one slot order, but both are written here once, on top of the virtual
+  // operations above, and no transport overrides them.
+
+  /// writeLine(command), then readLine(). No lock, no retry; failures are
+  /// those of the two operations.
+  virtual std::string query(const std::string &command);
   /// The bytes of the block that readBlock(command) answers, as the
-  /// characters of a text: raw, zero bytes included, not parsed.
-  std::string queryArray(const std::string &command);
+  /// characters of a text: raw, zero bytes included, not parsed. A block of
+  /// 3 zero bytes gives a text of length 3.
+  virtual std::string queryArray(const std::string &command);
 
   /// The session for `address`, not yet connected; empty for an empty
   /// address. The form of the address picks the transport, case-insensitive:
