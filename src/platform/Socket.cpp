@@ -257,6 +257,8 @@ long receiveAll(SocketHandle socket, void *data, std::size_t size) {
 
 bool shutdownReceive(SocketHandle socket) { return ::shutdown(socket, SHUT_RD) == 0 || fail(false); }
 
+bool shutdownSend(SocketHandle socket) { return ::shutdown(socket, SHUT_WR) == 0 || fail(false); }
+
 bool shutdownBoth(SocketHandle socket) { return ::shutdown(socket, SHUT_RDWR) == 0 || fail(false); }
 
 void closeSocket(SocketHandle socket) {

@@ -52,8 +52,10 @@ long receiveBytes(SocketHandle socket, void *data, std::size_t size);
 // fewer only at the end of the stream, on a time-out or an error (then -1
 // when nothing came).
 long receiveAll(SocketHandle socket, void *data, std::size_t size);
-// Ends the receiving side, or both sides.
+// Ends the receiving side, the sending side (the peer reads the end of the
+// stream), or both sides.
 bool shutdownReceive(SocketHandle socket);
+bool shutdownSend(SocketHandle socket);
 bool shutdownBoth(SocketHandle socket);
 void closeSocket(SocketHandle socket);
 
