@@ -57,12 +57,13 @@ format-check: bootstrap
 # project against that tree with CMake and with pkg-config and runs both.
 consumer: bootstrap
 	cmake --preset release
-	cmake --build --preset release -j 2 --target wavemill
+	cmake --build --preset release -j 2 --target wavemill wavemill_simulator wavemill-sim
 	rm -rf $(INSTALL_DIR) $(CONSUMER_DIR)
 	cmake --install build/release --prefix $(INSTALL_DIR)
 	cmake -S tests/consumer -B $(CONSUMER_DIR) -G Ninja -DCMAKE_BUILD_TYPE=Release -DCMAKE_PREFIX_PATH=$(INSTALL_DIR)
 	cmake --build $(CONSUMER_DIR)
 	$(CONSUMER_DIR)/wavemill_consumer
+	$(CONSUMER_DIR)/wavemill_consumer_simulator
 	PKG_CONFIG_PATH=$$(dirname $$(find $(INSTALL_DIR) -name wavemill.pc)) && export PKG_CONFIG_PATH && \
 	  $(CXX) -std=c++17 -o $(CONSUMER_DIR)/wavemill_consumer_pc tests/consumer/main.cpp \
 	  $$(pkg-config --cflags wavemill) $$(pkg-config --libs wavemill) \

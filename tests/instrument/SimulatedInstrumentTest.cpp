@@ -1,0 +1,203 @@
+#include "wavemill/simulator/SimulatedInstrument.h"
+
+#include "platform/Socket.h"
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <chrono>
+#include <memory>
+#include <string>
+#include <thread>
+#include <utility>
+#include <vector>
+
+using namespace Corvane::Wavemill;
+
+namespace {
+
+// A client on the bare socket layer, so that every byte on the wire is the
+// test's own choice.
+class RawClient {
+public:
+  explicit RawClient(int port, int timeoutInMS = 2000) : socket(Platform::openTcpSocket()) {
+    Platform::setReceiveTimeout(socket, timeoutInMS);
+    connected = Platform::connectIPv4(socket, "127.0.0.1", port) == 0;
+  }
+  ~RawClient() { Platform::closeSocket(socket); }
+
+  void send(const std::string &bytes) { Platform::sendAll(socket, bytes.data(), bytes.size()); }
+  // One answer line without its line feed; empty on a time-out.
+  std::string line() {
+    for (;;) {
+      if (const auto end = pending.find('\n'); end != std::string::npos) {
+        std::string answer = pending.substr(0, end);
+        pending.erase(0, end + 1);
+        return answer;
+      }
+      if (!receiveSome())
+        return {};
+    }
+  }
+  // Everything that comes until a time-out or the end of the stream.
+  std::string rest() {
+    while (receiveSome()) {
+    }
+    return std::exchange(pending, {});
+  }
+
+  Platform::SocketHandle socket;
+  bool connected = false;
+  bool ended = false;
+
+private:
+  bool receiveSome() {
+    char chunk[65536];
+    const long received = Platform::receiveBytes(socket, chunk, sizeof chunk);
+    ended = received == 0;
+    if (received <= 0)
+      return false;
+    pending.append(chunk, static_cast<std::size_t>(received));
+    return true;
+  }
+  std::string pending;
+};
+
+} // namespace
+
+TEST(SimulatedInstrumentTest, EveryLineEndAndCaseOfHeaderIsUnderstood) {
+  SimulatedInstrument instrument;
+  RawClient client(instrument.getPort());
+  ASSERT_TRUE(client.connected);
+  const struct {
+    const char *sent;
+    const char *answer;
+  } rows[] = {
+      {"*IDN?\n", "Corvane,SG200,100123,1.4.2"},
+      {"*idn?\r\n", "Corvane,SG200,100123,1.4.2"},
+      {"*OPT?\n\r", "B10,B22,K20,K24"},
+      {"FREQ 1e9\r:freq?\r", "1e9"},
+      {"sour1:pow? min\n", "-130"},
+      {"SOUR1:FREQ? MAX\n", "6000000000"},
+      {"*opc?\n", "1"},
+  };
+  for (const auto &row : rows) {
+    SCOPED_TRACE(row.sent);
+    client.send(row.sent);
+    EXPECT_EQ(client.line(), row.answer);
+  }
+  EXPECT_EQ(instrument.getValue("Freq"), "1e9");
+  // The second byte of each two-byte terminator is no command of its own.
+  EXPECT_EQ(instrument.getCommands().size(), 8u);
+}
+
+TEST(SimulatedInstrumentTest, UnknownQueriesAnswerNothingAndQueueErrorsUntilCleared) {
+  SimulatedInstrument instrument;
+  RawClient client(instrument.getPort());
+  // Had either query answered, "1" would not be the first line.
+  client.send("BOGUS?\nVOLT?\n*OPC?\n");
+  EXPECT_EQ(client.line(), "1");
+  client.send("SYST:ERR?\nsystem:error?\nSYST:ERR?\n");
+  EXPECT_EQ(client.line(), "-113,\"Undefined header\"");
+  EXPECT_EQ(client.line(), "-113,\"Undefined header\"");
+  EXPECT_EQ(client.line(), "0,\"No error\"");
+  client.send("NONE?\n*CLS\nSYST:ERR?\n");
+  EXPECT_EQ(client.line(), "0,\"No error\"");
+}
+
+TEST(SimulatedInstrumentTest, SeveralClientsAreServedAtOnceWithSharedState) {
+  SimulatedInstrument instrument;
+  std::vector<std::unique_ptr<RawClient>> clients;
+  for (int i = 0; i < 4; ++i)
+    clients.push_back(std::make_unique<RawClient>(instrument.getPort()));
+  // Each client is open while the others talk, so one thread per client.
+  for (std::size_t i = 0; i < clients.size(); ++i)
+    clients[i]->send("CH" + std::to_string(i) + " " + std::to_string(i * 10) + "\n*OPC?\n");
+  for (auto &client : clients)
+    EXPECT_EQ(client->line(), "1"); // stored before anyone reads it
+  for (std::size_t i = 0; i < clients.size(); ++i) {
+    clients[i]->send("CH" + std::to_string((i + 1) % 4) + "?\n");
+    EXPECT_EQ(clients[i]->line(), std::to_string((i + 1) % 4 * 10));
+  }
+  EXPECT_EQ(instrument.getConnectionCount(), 4u);
+}
+
+TEST(SimulatedInstrumentTest, LargeBlockComesBackIntactAndResetForgetsIt) {
+  SimulatedInstrument instrument;
+  RawClient client(instrument.getPort(), 10000);
+  std::vector<unsigned char> data(64 * 1024 * 1024 + 3);
+  for (std::size_t i = 0; i < data.size(); ++i)
+    data[i] = static_cast<unsigned char>(i * 7 + i / 251); // every byte value, also '\n' and '#'
+  client.send("MMEM:DATA 'big.wv',#8" + std::to_string(data.size()));
+  Platform::sendAll(client.socket, data.data(), data.size());
+  client.send("\n\rSOUR:WAV:DATA #15a\nb#c\n\rMMEM:DATA? 'big.wv'\n");
+
+  const std::string header = "#8" + std::to_string(data.size());
+  std::vector<unsigned char> answer(header.size() + data.size() + 1);
+  ASSERT_EQ(Platform::receiveAll(client.socket, answer.data(), answer.size()), static_cast<long>(answer.size()));
+  EXPECT_EQ(std::string(answer.begin(), answer.begin() + static_cast<long>(header.size())), header);
+  EXPECT_TRUE(std::equal(data.begin(), data.end(), answer.begin() + static_cast<long>(header.size())));
+  EXPECT_EQ(answer.back(), '\n');
+  EXPECT_EQ(instrument.getBlock("SOUR:WAV:DATA"), (std::vector<unsigned char>{'a', '\n', 'b', '#', 'c'}));
+  EXPECT_EQ(instrument.getCommands(),
+            (std::vector<std::string>{"MMEM:DATA 'big.wv',", "SOUR:WAV:DATA", "MMEM:DATA? 'big.wv'"}));
+
+  client.send("*RST\nMMEM:DATA? 'big.wv'\nSYST:ERR?\n");
+  EXPECT_EQ(client.line(), "-113,\"Undefined header\"");
+  EXPECT_TRUE(instrument.getBlock("big.wv").empty());
+}
+
+TEST(SimulatedInstrumentTest, FaultsBreakAnswersTheWayTheyAnnounce) {
+  SimulatedInstrument instrument;
+  const struct {
+    SimulatorFault fault;
+    const char *received;
+    bool closed;
+  } rows[] = {
+      {SimulatorFault::None, "#2100123456789\n", false},
+      {SimulatorFault::Trickle, "#2100123456789\n", false},
+      {SimulatorFault::NoTerminator, "#2100123456789", false},
+      {SimulatorFault::GarbageBlock, "garbage\n", false},
+      {SimulatorFault::ShortBlock, "#21001234", false},
+      {SimulatorFault::CloseMidBlock, "#21001234", true},
+      {SimulatorFault::Stall, "", false},
+      {SimulatorFault::RefuseConnections, "", true},
+  };
+  for (const auto &row : rows) {
+    SCOPED_TRACE(toString(row.fault));
+    instrument.setFault(SimulatorFault::None);
+    RawClient client(instrument.getPort(), 300);
+    client.send("MMEM:DATA 'w',#2100123456789\n");
+    client.send("*OPC?\n");
+    EXPECT_EQ(client.line(), "1"); // the block is stored before the fault applies
+    instrument.setFault(row.fault);
+    if (row.fault == SimulatorFault::RefuseConnections) {
+      RawClient refused(instrument.getPort(), 300);
+      EXPECT_EQ(refused.rest(), "");
+      EXPECT_TRUE(refused.ended);
+      continue;
+    }
+    client.send("MMEM:DATA? 'w'\n");
+    EXPECT_EQ(client.rest(), row.received);
+    EXPECT_EQ(client.ended, row.closed);
+  }
+}
+
+TEST(SimulatedInstrumentTest, StopReturnsPromptlyWhileClientsWaitOrTrickle) {
+  SimulatedInstrument instrument;
+  RawClient stalled(instrument.getPort());
+  RawClient trickled(instrument.getPort());
+  trickled.send("MMEM:DATA 'w',#45000" + std::string(5000, 'x') + "\n*OPC?\n");
+  EXPECT_EQ(trickled.line(), "1");
+  instrument.setFault(SimulatorFault::Trickle);
+  trickled.send("MMEM:DATA? 'w'\n"); // about 33 s of pieces
+  char piece[3];
+  ASSERT_GT(Platform::receiveBytes(trickled.socket, piece, sizeof piece), 0); // the trickle is under way
+  instrument.setFault(SimulatorFault::Stall);
+  stalled.send("*IDN?\n");
+
+  const auto start = std::chrono::steady_clock::now();
+  instrument.stop();
+  EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::milliseconds(1000));
+  EXPECT_EQ(RawClient(instrument.getPort(), 300).connected, false);
+}
