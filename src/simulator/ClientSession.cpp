@@ -184,7 +184,12 @@ bool ClientSession::receiveBlock(const std::string &command) {
 
 bool ClientSession::execute(const std::string &command) {
   const auto [header, parameter] = splitCommand(command);
-  if (header.empty() || header.back() != '?') {
+  if (header.empty() || header == "?") {
+    // A lone ":" or "?" names nothing that could be stored or answered.
+    undefinedHeader();
+    return true;
+  }
+  if (header.back() != '?') {
     if (header == "*RST")
       state.reset();
     else if (header == "*CLS")
