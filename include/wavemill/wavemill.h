@@ -5,6 +5,8 @@
 
 #include "wavemill/Export.h"
 #include "wavemill/instrument/InstrumentIOSession.h"
+#include "wavemill/instrument/LanIOSession.h"
+#include "wavemill/instrument/VisaIOSession.h"
 #include "wavemill/instrument/WSAClass.h"
 #include "wavemill/json/ConverterBase.h"
 #include "wavemill/json/DisplayDataSerializer.h"
