@@ -1,0 +1,124 @@
+#include "wavemill/instrument/HardwareResource.h"
+
+#include "support/ExpectThrow.h"
+#include "support/TestInstrument.h"
+#include "wavemill/simulator/SimulatedInstrument.h"
+#include "wavemill/tools/Exceptions.h"
+#include "wavemill/tools/Tools.h"
+
+#include <gtest/gtest.h>
+
+#include <functional>
+#include <memory>
+
+using namespace Corvane::Wavemill;
+using Testing::TestInstrument;
+using Testing::thrownMessage;
+using Strings = std::vector<std::string>;
+
+TEST(HardwareResourceTest, HasLooksAtTheFirstOccurrenceAndTheIndexOfTheOptionLength) {
+  const struct {
+    const char *options;
+    const char *option;
+    bool expected;
+  } rows[] = {
+      {"B10,B22,K20", "B10", true}, {"B10,B22,K20", "K20", true}, // first and last always hold
+      {"B10,B22,K20", "B22", true},                               // inner: index 3 of the list is ','
+      {"A,BC,D", "BC", false},                                    // inner: index 2 is 'B'
+      {"ABC BC", "BC", false},                                    // first occurrence inside ABC
+      {"B10,B1", "B1", false},      {"B10", "B1", false},         {"XB10", "B10", false}, {"B10 B22", " B22 ", true},
+      {"B10,K20", "k20", false},    {"", "B10", false},           {"B10", "", true},      {"B10", "   ", true},
+  };
+  for (const auto &row : rows) {
+    SCOPED_TRACE(std::string(row.options) + " has " + row.option);
+    HardwareResource resource;
+    resource.setOptions(row.options);
+    EXPECT_EQ(resource.has(row.option), row.expected);
+  }
+}
+
+TEST(HardwareResourceTest, ChecksNameTheMissingOptionsForTheModel) {
+  HardwareResource resource;
+  resource.setModelNumber("SG200");
+  resource.setOptions("B10,K20");
+  Strings none;
+  const auto yesNo = [](bool b) { return std::string(b ? "yes" : "no"); };
+  const struct {
+    std::function<std::string()> result;
+    const char *expected;
+  } rows[] = {
+      {[&] { return yesNo(resource.hasAny("") && resource.hasAny(none)); }, "yes"},
+      {[&] { return yesNo(resource.hasAny("X1,K20")); }, "yes"},
+      {[&] { return yesNo(resource.hasAny("X1,X2")); }, "no"},
+      {[&] { return resource.checkAll("B10,K20", true) + resource.checkAll("", true); }, ""},
+      {[&] { return resource.checkAll("X1,B10", false); }, "Option X1 is required for SG200."},
+      {[&] { return resource.checkAll("X1,B10,Y2", false); }, "Options X1Y2are required for SG200."},
+      {[&] { return resource.checkAll("X1,Y2,Z3", false); }, "Options X1Y2and Z3are required for SG200."},
+      {[&] { return resource.checkAny("X1,K20", true) + resource.checkAny("", true); }, ""},
+      {[&] { return resource.checkAny("X1", false); }, "Option X1is required for SG200."},
+      {[&] { return resource.checkAny("X1,Y2", false); }, "One of the options(X1/Y2) is required for SG200."},
+      {[&] { return thrownMessage<InstrumentException>([&] { resource.checkAll("X1", true); }); },
+       "Option X1 is required for SG200."},
+      {[&] { return thrownMessage<InstrumentException>([&] { resource.checkAny("X1,Y2", true); }); },
+       "One of the options(X1/Y2) is required for SG200."},
+  };
+  for (const auto &row : rows) {
+    SCOPED_TRACE(row.expected);
+    EXPECT_EQ(row.result(), row.expected);
+  }
+}
+
+TEST(HardwareResourceTest, JoinPutsItsSeparatorsAfterTheSecondPartOn) {
+  const struct {
+    Strings parts;
+    const char *expected;
+  } rows[] = {
+      {{}, ""},
+      {{"A"}, "A"},
+      {{"A", "B"}, "AB"},
+      {{"A", "B", "C"}, "ABand C"},
+      {{"A", "B", "C", "D", "E"}, "AB, C, Dand E"},
+  };
+  for (auto row : rows) {
+    SCOPED_TRACE(row.expected);
+    EXPECT_EQ(HardwareResource::join(row.parts), row.expected);
+  }
+}
+
+TEST(HardwareResourceTest, UpdateConnectionTakesACompleteIdentityOnlyAndKeepsItForTheAddress) {
+  SimulatedInstrument simulator;
+  auto instrument = std::make_shared<TestInstrument>(simulator.getAddress(), 500);
+  HardwareResource resource;
+
+  simulator.setIdentity("Corvane, SG200 ,100123,1.4.2,extra");
+  resource.updateConnection(instrument);
+  EXPECT_TRUE(resource.isValid());
+  EXPECT_EQ((Strings{resource.getManufacturer(), resource.getModelNumber(), resource.getSerialNumber(),
+                     resource.getFirmwareRevision(), resource.getOptions(), resource.getExtOptions()}),
+            (Strings{"Corvane", "SG200", "100123", "1.4.2", SimulatorOptions().options, ""}));
+  resource.updateConnection(instrument); // valid for this address: nothing is asked
+  resource.setAddress(Tools::toUpper(simulator.getAddress()));
+  EXPECT_TRUE(resource.isValid());
+  EXPECT_EQ(resource.getAddress(), simulator.getAddress());
+  EXPECT_EQ(simulator.getCommands(), (Strings{"*IDN?", "*OPT?"}));
+
+  resource.setAddress("TCPIP0::127.0.0.2::5025::SOCKET");
+  EXPECT_FALSE(resource.isValid());
+  EXPECT_EQ(resource.getModelNumber(), "");
+  EXPECT_EQ(resource.getManufacturer(), "Corvane");
+
+  simulator.setIdentity("Corvane,SG200,100123");
+  simulator.clearCommands();
+  resource.updateConnection(instrument);
+  resource.updateConnection(instrument);
+  EXPECT_FALSE(resource.isValid());
+  EXPECT_EQ(resource.getIdentity(), "Corvane,SG200,100123");
+  EXPECT_EQ(resource.getManufacturer(), "");
+  EXPECT_EQ(simulator.getCommands(), (Strings{"*IDN?", "*IDN?"}));
+
+  simulator.setFault(SimulatorFault::Stall); // the answer is empty after the time-out
+  resource.setIdentity("kept");
+  resource.updateConnection(instrument);
+  EXPECT_FALSE(resource.isValid());
+  EXPECT_EQ(resource.getIdentity(), "kept");
+}

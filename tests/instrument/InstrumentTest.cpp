@@ -1,0 +1,246 @@
+#include "wavemill/instrument/Instrument.h"
+
+#include "support/TestInstrument.h"
+#include "wavemill/models/DoubleSetting.h"
+#include "wavemill/simulator/SimulatedInstrument.h"
+#include "wavemill/tools/Exceptions.h"
+
+#include <gtest/gtest.h>
+
+#include <chrono>
+#include <clocale>
+#include <functional>
+#include <limits>
+#include <memory>
+#include <stdexcept>
+
+using namespace Corvane::Wavemill;
+using Testing::TestInstrument;
+using Strings = std::vector<std::string>;
+
+namespace {
+
+// The type and the text of what `action` throws, in one comparable string.
+std::string thrown(const std::function<void()> &action) {
+  try {
+    action();
+  } catch (const ArgumentOutOfRangeException &e) {
+    return "out_of_range: " + e.getMessage();
+  } catch (const std::invalid_argument &e) {
+    return std::string("invalid_argument: ") + e.what();
+  } catch (const std::runtime_error &e) {
+    return std::string("runtime_error: ") + e.what();
+  }
+  return "nothing";
+}
+
+std::vector<unsigned char> pattern(std::size_t size) {
+  std::vector<unsigned char> bytes(size);
+  for (std::size_t i = 0; i < size; ++i)
+    bytes[i] = static_cast<unsigned char>(i * 7); // zero bytes, '\n' and '#' included
+  return bytes;
+}
+
+} // namespace
+
+TEST(InstrumentTest, SendWritesOneLineAndReadsTheAnswerOfAQueryOnly) {
+  SimulatedInstrument simulator;
+  TestInstrument instrument(simulator.getAddress(), 2000);
+  const std::string previous = std::setlocale(LC_ALL, nullptr);
+  std::setlocale(LC_ALL, "de_DE.utf8"); // printf writes 1,5 here, where the locale is installed
+  const struct {
+    std::function<void()> send;
+    const char *onWire;
+  } rows[] = {
+      {[&] { instrument.send("FREQ 1E9"); }, "FREQ 1E9"},
+      {[&] { instrument.send("*IDN?"); }, "*IDN?"},
+      {[&] { instrument.send("[:SOUR1]:FREQ? MAX"); }, ":SOUR1:FREQ? MAX"},
+      {[&] { instrument.send("[SOUR1:]FREQ[:CW] 2E9"); }, "SOUR1:FREQ:CW 2E9"},
+      {[&] { instrument.send("MMEM:NAME 'a[1]'"); }, "MMEM:NAME 'a[1]'"},
+      {[&] { instrument.send("[SOUR1:]LIST:NAME 'x[2]'"); }, "SOUR1:LIST:NAME 'x[2]'"},
+      {[&] { instrument.sendNumber("FREQ ", 1.5); }, "FREQ 1.500000"},
+      {[&] { instrument.sendNumber("FREQ", 1e9); }, "FREQ 1000000000.000000"},
+      {[&] { instrument.sendNumber("FREQ", -4e-7); }, "FREQ -0.000000"},
+  };
+  for (const auto &row : rows) {
+    SCOPED_TRACE(row.onWire);
+    simulator.clearCommands();
+    const auto start = std::chrono::steady_clock::now();
+    row.send();
+    // A read after a command would wait for the whole time-out.
+    EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::milliseconds(1000));
+    // An answer left in the input would be read here instead of "1".
+    EXPECT_EQ(instrument.query("*OPC?", -1), "1");
+    EXPECT_EQ(simulator.getCommands(), (Strings{row.onWire, "*OPC?"}));
+  }
+  std::setlocale(LC_ALL, previous.c_str());
+}
+
+TEST(InstrumentTest, ArgumentFaultsThrowTheirTextAndSendNothing) {
+  SimulatedInstrument simulator;
+  TestInstrument instrument(simulator.getAddress(), 2000);
+  TestInstrument idle("", 2000);
+  idle.setThrowOnError(false);
+  std::vector<unsigned char> data(4);
+  const struct {
+    std::function<void()> action;
+    const char *expected;
+  } rows[] = {
+      {[&] { instrument.send(""); }, "invalid_argument: command"},
+      {[&] { instrument.query("", -1); }, "invalid_argument: command"},
+      {[&] { instrument.query("*IDN?", -2); }, "invalid_argument: timeoutInMS"},
+      {[&] { instrument.queryBlock("", 0); }, "invalid_argument: command"},
+      {[&] { instrument.queryBlock("X?", -2); }, "out_of_range: timeoutInMS"},
+      {[&] { instrument.queryArray(""); }, "invalid_argument: query"},
+      {[&] { instrument.sendBlock("", data, 0); }, "invalid_argument: command"},
+      {[&] { instrument.sendIfDifferent("FREQ"); }, "invalid_argument: command"},
+      {[&] { instrument.sendIfDifferent("FREQ 1 2"); }, "invalid_argument: command"},
+      {[&] { instrument.sendIfDifferent("FREQ  1"); }, "invalid_argument: command"},
+      {[&] { idle.query("*IDN?", -1); }, "runtime_error: The instrument address is empty."},
+  };
+  for (const auto &row : rows) {
+    SCOPED_TRACE(row.expected);
+    EXPECT_EQ(thrown(row.action), row.expected);
+  }
+  EXPECT_TRUE(simulator.getCommands().empty());
+  // 0 is a valid time-out for query: the connection opens with the default.
+  EXPECT_EQ(instrument.query("*IDN?", 0), SimulatorOptions().identity);
+}
+
+TEST(InstrumentTest, SendIfDifferentComparesNumbersByValueAndTextsByShortForm) {
+  SimulatedInstrument simulator;
+  TestInstrument instrument(simulator.getAddress(), 500);
+  const struct {
+    const char *present;
+    const char *command;
+    const char *outcome;
+  } rows[] = {
+      {"FREQ +1.00000000E+009", "FREQ 1E9", "kept"},
+      {"FREQ +1.00000000E+009", "FREQ 2E9", "sent"},
+      {"UNIT VOLT", "UNIT VOLTAGE", "kept"},
+      {"UNIT VOLT", "UNIT voltage", "sent"},
+      {"UNIT VOLTAGE", "UNIT VOLT", "sent"},
+      {"FREQ 1E9", "FREQ -", "kept"},
+      {"*CLS", "NEVER 1", "invalid_argument: The SCPI command is incorrrect."},
+  };
+  for (const auto &row : rows) {
+    SCOPED_TRACE(row.command);
+    instrument.send(row.present);
+    instrument.query("*OPC?", -1); // the simulator has taken the value in
+    simulator.clearCommands();
+    const std::string command = row.command;
+    const std::string query = command.substr(0, command.find(' ')) + "?";
+    std::string outcome;
+    if (const std::string error = thrown([&] { outcome = instrument.sendIfDifferent(command) ? "sent" : "kept"; });
+        error != "nothing")
+      outcome = error;
+    EXPECT_EQ(outcome, row.outcome);
+    if (outcome == "sent" || outcome == "kept") {
+      const Strings wire = outcome == "sent" ? Strings{query, command} : Strings{query};
+      EXPECT_EQ(simulator.getCommands(), wire);
+      EXPECT_FALSE(instrument.sendIfDifferent(command)); // the second push finds the value in place
+    }
+  }
+}
+
+TEST(InstrumentTest, SendBlockPutsTheSameBytesOnTheWireWhateverTheThreshold) {
+  SimulatedInstrument simulator;
+  TestInstrument instrument(simulator.getAddress(), 2000);
+  const struct {
+    const char *command;
+    std::size_t size;
+    int maxBlockSize;
+    const char *header;
+  } rows[] = {
+      {"MMEM:DATA 'w'", 5000, 4096, "MMEM:DATA 'w',#45000"}, {"MMEM:DATA 'w'", 5000, 8192, "MMEM:DATA 'w',#45000"},
+      {"MMEM:DATA 'w'", 8192, 4096, "MMEM:DATA 'w',#48192"}, {"MMEM:DATA 'w'", 4097, 100, "MMEM:DATA 'w',#44097"},
+      {" MMEM:DATA 'w' ", 5, 0, "MMEM:DATA 'w',#15"},        {" MMEM:DATA 'w', ", 5, 0, " MMEM:DATA 'w', #15"},
+      {" SOUR:WAV:DATA ", 5, 0, "SOUR:WAV:DATA #15"},
+  };
+  for (const auto &row : rows) {
+    SCOPED_TRACE(std::string(row.header) + " " + std::to_string(row.maxBlockSize));
+    auto data = pattern(row.size);
+    simulator.setRecording(false);
+    simulator.setRecording(true);
+    instrument.sendBlock(row.command, data, row.maxBlockSize);
+    EXPECT_EQ(instrument.query("*OPC?", -1), "1");
+    // The last "\r" may still be on its way when the answer is in.
+    const std::string expected = row.header + std::string(data.begin(), data.end()) + "\n\r*OPC?\n";
+    EXPECT_EQ(simulator.getRecordedBytes().substr(0, expected.size()), expected);
+  }
+  EXPECT_EQ(simulator.getBlock("SOUR:WAV:DATA"), pattern(5));
+}
+
+TEST(InstrumentTest, FailuresThrowTheirTextOrEndEmptyByThrowOnError) {
+  auto simulator = std::make_unique<SimulatedInstrument>();
+  const std::string address = simulator->getAddress();
+  TestInstrument connected(address, 1000);
+  EXPECT_EQ(connected.query("*OPC?", -1), "1");
+  simulator.reset(); // the open connection is gone, and the port refuses from now on
+
+  // The peer's reset shows as a failed send, and the session's own text is
+  // lost in the message.
+  connected.setThrowOnError(false);
+  EXPECT_EQ(connected.query("*OPC?", -1), "");
+  connected.setThrowOnError(true);
+  EXPECT_EQ(thrown([&] { connected.query("*IDN?", -1); }), "runtime_error: Application Exception(*IDN?)");
+
+  TestInstrument instrument(address, 1000);
+  EXPECT_EQ(thrown([&] { instrument.query("*IDN?", -1); }), "runtime_error: Failed to send SCPI *IDN? to " + address);
+  instrument.setThrowOnError(false);
+  std::vector<unsigned char> data(5000);
+  EXPECT_EQ(instrument.query("*IDN?", -1), "");
+  EXPECT_EQ(instrument.queryNumber("FREQ?"), 0.0);
+  EXPECT_EQ(instrument.queryArray("MMEM:DATA? 'w'"), "");
+  EXPECT_TRUE(instrument.queryBlock("MMEM:DATA? 'w'", 0).empty());
+  EXPECT_EQ(thrown([&] { instrument.send("FREQ 1"), instrument.sendBlock("MMEM:DATA 'w'", data, 0); }), "nothing");
+  // Without an answer there is nothing to compare with.
+  EXPECT_EQ(thrown([&] { instrument.sendIfDifferent("FREQ 1"); }), "invalid_argument: The SCPI command is incorrrect.");
+}
+
+TEST(InstrumentTest, ConnectsOnFirstUseAndPerOperationWhenAsked) {
+  SimulatedInstrument simulator;
+  TestInstrument instrument(simulator.getAddress(), 2000);
+  EXPECT_EQ(simulator.getConnectionCount(), 0U);
+  instrument.query("*OPC?", -1);
+  instrument.query("*OPC?", -1);
+  EXPECT_EQ(simulator.getConnectionCount(), 1U);
+  instrument.setDisconnectAfterUse(true);
+  for (int i = 0; i < 3; ++i)
+    EXPECT_EQ(instrument.query("*IDN?", -1), SimulatorOptions().identity);
+  EXPECT_EQ(simulator.getConnectionCount(), 3U); // the open one is used once more, then one per query
+}
+
+TEST(InstrumentTest, ClipUsesTheRangeKeptByNameOrTheInstrumentLimits) {
+  SimulatedInstrument simulator;
+  auto instrument = std::make_shared<TestInstrument>(simulator.getAddress(), 2000);
+  auto &ranges = instrument->getHardwareResource()->getRanges();
+  ranges["Stepped"] = {0.0, 100.0, 10.0};
+  const double tiny = std::numeric_limits<double>::min();
+  const struct {
+    const char *name;
+    double value;
+    std::function<void(const std::shared_ptr<DoubleSetting> &)> clip;
+    double expected;
+  } rows[] = {
+      {"Frequency", 1e10, [&](auto &s) { instrument->queryAndClip(s, instrument, "FREQ"); }, 6e9},
+      {"Power", -200.0, [&](auto &s) { instrument->queryAndClip(s, instrument, "POW"); }, -130.0},
+      {"Default", -5.0, [&](auto &s) { instrument->clip(s); }, tiny}, // a new range starts above zero
+      {"Limited", 20.0, [&](auto &s) { instrument->setAndClip(s, 0.0, 10.0); }, 10.0},
+      {"Stepped", 37.0, [&](auto &s) { instrument->clip(s); }, 40.0},
+      {"Stepped", 37.0, [&](auto &s) { instrument->clip(s, 25.0); }, 25.0},
+      {"Stepped", 37.0, [&](auto &s) { instrument->setAndClip(s, 0.0, 30.0, 4.0); }, 30.0},
+  };
+  for (const auto &row : rows) {
+    SCOPED_TRACE(row.name);
+    auto setting = std::make_shared<DoubleSetting>(row.name);
+    setting->setValue(row.value);
+    row.clip(setting);
+    EXPECT_EQ(setting->getValue(), row.expected);
+    EXPECT_EQ(ranges.count(row.name), 1U);
+  }
+  // Limits given or asked for are used once and not kept.
+  EXPECT_EQ(ranges["Limited"].max, std::numeric_limits<double>::max());
+  EXPECT_EQ(ranges["Frequency"].min, tiny);
+  EXPECT_EQ(ranges["Stepped"].max, 100.0);
+}
