@@ -37,11 +37,11 @@ TEST(HardwareResourceTest, HasLooksAtTheFirstOccurrenceAndTheIndexOfTheOptionLen
   }
 }
 
-TEST(HardwareResourceTest, ChecksNameTheMissingOptionsForTheModel) {
+TEST(HardwareResourceTest, ChecksNameTheMissingOptionsJoinedForTheModel) {
   HardwareResource resource;
   resource.setModelNumber("SG200");
   resource.setOptions("B10,K20");
-  Strings none;
+  Strings none, two{"A", "B"}, five{"A", "B", "C", "D", "E"};
   const auto yesNo = [](bool b) { return std::string(b ? "yes" : "no"); };
   const struct {
     std::function<std::string()> result;
@@ -57,6 +57,8 @@ TEST(HardwareResourceTest, ChecksNameTheMissingOptionsForTheModel) {
       {[&] { return resource.checkAny("X1,K20", true) + resource.checkAny("", true); }, ""},
       {[&] { return resource.checkAny("X1", false); }, "Option X1is required for SG200."},
       {[&] { return resource.checkAny("X1,Y2", false); }, "One of the options(X1/Y2) is required for SG200."},
+      {[&] { return HardwareResource::join(none) + "|" + HardwareResource::join(two); }, "|AB"},
+      {[&] { return HardwareResource::join(five); }, "AB, C, Dand E"}, // no separator after the first part
       {[&] { return thrownMessage<InstrumentException>([&] { resource.checkAll("X1", true); }); },
        "Option X1 is required for SG200."},
       {[&] { return thrownMessage<InstrumentException>([&] { resource.checkAny("X1,Y2", true); }); },
@@ -65,23 +67,6 @@ TEST(HardwareResourceTest, ChecksNameTheMissingOptionsForTheModel) {
   for (const auto &row : rows) {
     SCOPED_TRACE(row.expected);
     EXPECT_EQ(row.result(), row.expected);
-  }
-}
-
-TEST(HardwareResourceTest, JoinPutsItsSeparatorsAfterTheSecondPartOn) {
-  const struct {
-    Strings parts;
-    const char *expected;
-  } rows[] = {
-      {{}, ""},
-      {{"A"}, "A"},
-      {{"A", "B"}, "AB"},
-      {{"A", "B", "C"}, "ABand C"},
-      {{"A", "B", "C", "D", "E"}, "AB, C, Dand E"},
-  };
-  for (auto row : rows) {
-    SCOPED_TRACE(row.expected);
-    EXPECT_EQ(HardwareResource::join(row.parts), row.expected);
   }
 }
 
