@@ -316,6 +316,8 @@ void tools() {
 
 } // namespace
 
+void instruments(); // Instruments.cpp
+
 int main() {
   std::cout << "Wavemill demo\n";
   roadOfAChange();
@@ -323,5 +325,6 @@ int main() {
   namesAndLibraries();
   saveAndRecall();
   tools();
+  instruments();
   return 0;
 }

@@ -20,6 +20,9 @@ InstrumentState::InstrumentState(const SimulatorOptions &options)
     : fault(options.fault), identityText(options.identity), optionsText(options.options) {
   for (const auto &[header, limits] : options.ranges)
     ranges[upperCase(header)] = limits;
+  for (const auto &[header, value] : options.values)
+    presetValues[upperCase(header)] = value;
+  values = presetValues;
 }
 
 std::string InstrumentState::identity() const {
@@ -81,7 +84,7 @@ std::shared_ptr<const Block> InstrumentState::block(const std::string &name) con
 void InstrumentState::reset() {
   std::map<std::string, std::shared_ptr<const Block>> old;
   std::lock_guard<std::mutex> lock(mutex);
-  values.clear();
+  values = presetValues;
   old.swap(blocks);
 }
 

@@ -62,6 +62,7 @@ private:
   std::string optionsText;
   std::map<std::string, std::pair<double, double>> ranges; // by upper-case header
   std::map<std::string, std::string> values;
+  std::map<std::string, std::string> presetValues; // by upper-case header; restored by *RST
   std::map<std::string, std::shared_ptr<const Block>> blocks;
   std::deque<std::string> errors;
   std::deque<std::string> commandLog;

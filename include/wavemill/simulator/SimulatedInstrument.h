@@ -62,6 +62,12 @@ struct SimulatorOptions {
   /// client writes it, compared without regard to case.
   std::map<std::string, std::pair<double, double>> ranges = {
       {"FREQ", {1e6, 6e9}}, {"POW", {-130.0, 20.0}}, {"SOUR1:FREQ", {1e6, 6e9}}, {"SOUR1:POW", {-130.0, 20.0}}};
+  /// What "HEADER?" answers before a command stores a value, and again
+  /// after "*RST": the instrument's preset state, by header as the client
+  /// writes it, compared without regard to case.
+  std::map<std::string, std::string> values = {{"FREQ", "1000000000"}, {"SOUR1:FREQ", "1000000000"},
+                                               {"POW", "-10"},         {"SOUR1:POW", "-10"},
+                                               {"OUTP", "0"},          {"OUTP1", "0"}};
 };
 
 /// A SCPI instrument on a TCP socket, for tests, demos and users without
@@ -73,7 +79,7 @@ struct SimulatorOptions {
 /// Answers end with a line feed.
 ///
 /// - "*IDN?", "*OPT?" answer the identity and the options; "*OPC?" answers
-///   1; "*RST" forgets every stored value and block; "*CLS" empties the
+///   1; "*RST" returns every value to its preset and forgets the blocks; "*CLS" empties the
 ///   error queue.
 /// - "SYST:ERR?" (or "SYSTEM:ERROR?") answers the oldest entry of the error
 ///   queue, or 0,"No error" when it is empty. The queue keeps at most 32
