@@ -29,4 +29,19 @@ template <class E, class F> std::string thrownMessage(F &&action) {
   return {};
 }
 
+/// Which of the library's two instrument-layer exceptions `action` throws,
+/// with its message: "InstrumentException: text", "ApplicationException:
+/// text" for an ApplicationException that is no InstrumentException, or
+/// "nothing". Other exceptions pass through.
+template <class F> std::string thrownLibraryException(F &&action) {
+  try {
+    action();
+  } catch (const InstrumentException &error) {
+    return "InstrumentException: " + error.getMessage();
+  } catch (const ApplicationException &error) {
+    return "ApplicationException: " + error.getMessage();
+  }
+  return "nothing";
+}
+
 } // namespace Corvane::Wavemill::Testing
