@@ -67,3 +67,8 @@
 #include "wavemill/tools/OperationSystem.h"
 #include "wavemill/tools/Path.h"
 #include "wavemill/tools/Tools.h"
+#include "wavemill/waveform/CSHA1.h"
+#include "wavemill/waveform/EncryptKey.h"
+#include "wavemill/waveform/Encryptor.h"
+#include "wavemill/waveform/Rijndael.h"
+#include "wavemill/waveform/SecureHash.h"
