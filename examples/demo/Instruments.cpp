@@ -8,6 +8,7 @@
 #include "wavemill/simulator/SimulatedInstrument.h"
 
 #include <chrono>
+#include <cstdlib>
 #include <iostream>
 #include <memory>
 #include <stdexcept>
@@ -37,6 +38,35 @@ int push(SignalGeneratorInstrument &instrument, double frequency, double level, 
   sent += instrument.sendIfDifferent("SOUR1:POW " + levelText.toString());
   sent += instrument.sendIfDifferent(std::string("OUTP ") + (output ? "ON" : "OFF"));
   return sent;
+}
+
+// The demo configures Wavemill's own VISA library through its environment,
+// as a user would in the shell.
+void setEnvironment(const char *name, const std::string &value) {
+#ifdef _WIN32
+  _putenv_s(name, value.c_str());
+#else
+  setenv(name, value.c_str(), 1);
+#endif
+}
+
+// Finds the simulated instrument through the VISA library and asks its
+// identity over a VISA address.
+void throughVisa(const SimulatedInstrument &simulator) {
+  const std::string port = std::to_string(simulator.getPort());
+  const std::string resource = "TCPIP0::127.0.0.1::inst0::INSTR";
+  setEnvironment("CORVISA_RESOURCES", resource + ";TCPIP0::127.0.0.1::" + port + "::SOCKET;ASRL1::INSTR");
+  setEnvironment("CORVISA_INSTR_PORT", port);
+  std::cout << "VISA resources matching ?*INSTR:";
+  for (const auto &found : VisaIOSession::discover("?*INSTR"))
+    std::cout << " " << found;
+  std::cout << "\n";
+  Instrument overVisa(resource);
+  try {
+    std::cout << "*IDN? through " << resource << " -> " << overVisa.query("*IDN?", -1) << "\n";
+  } catch (const std::exception &error) {
+    std::cout << "no VISA library answered: " << error.what() << "\n";
+  }
 }
 
 } // namespace
@@ -69,6 +99,8 @@ void instruments() {
   instrument->readLine(1000); // the line feed behind the block
   std::cout << "sent a block of " << waveform.size() << " bytes and read back " << back.size() << " bytes: "
             << (back == waveform ? "equal" : "DIFFERENT") << "\n";
+
+  throughVisa(simulator);
 
   // A query that meets silence: the LAN session waits for its time-out,
   // reports the socket error on the "Log" channel and answers nothing.
