@@ -44,28 +44,26 @@ void CSHA1::transform(std::uint32_t chain[5], const unsigned char block[64]) {
     w[t] = rotl(w[t - 3] ^ w[t - 8] ^ w[t - 14] ^ w[t - 16], 1);
   }
   Word a = chain[0], b = chain[1], c = chain[2], d = chain[3], e = chain[4];
-  for (int t = 0; t < 80; ++t) {
-    Word f = 0;
-    Word k = 0;
-    if (t < 20) {
-      f = (b & c) | (~b & d);
-      k = 0x5a827999;
-    } else if (t < 40) {
-      f = b ^ c ^ d;
-      k = 0x6ed9eba1;
-    } else if (t < 60) {
-      f = (b & c) | (b & d) | (c & d);
-      k = 0x8f1bbcdc;
-    } else {
-      f = b ^ c ^ d;
-      k = 0xca62c1d6;
-    }
-    const Word temp = rotl(a, 5) + f + e + k + w[t];
+  // One loop per round function, so no round decides which function it runs.
+  auto round = [&](Word f, Word k, Word word) {
+    const Word temp = rotl(a, 5) + f + e + k + word;
     e = d;
     d = c;
     c = rotl(b, 30);
     b = a;
     a = temp;
+  };
+  for (int t = 0; t < 20; ++t) {
+    round(d ^ (b & (c ^ d)), 0x5a827999, w[t]);
+  }
+  for (int t = 20; t < 40; ++t) {
+    round(b ^ c ^ d, 0x6ed9eba1, w[t]);
+  }
+  for (int t = 40; t < 60; ++t) {
+    round((b & c) | (d & (b | c)), 0x8f1bbcdc, w[t]);
+  }
+  for (int t = 60; t < 80; ++t) {
+    round(b ^ c ^ d, 0xca62c1d6, w[t]);
   }
   chain[0] += a;
   chain[1] += b;
