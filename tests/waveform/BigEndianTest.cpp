@@ -1,0 +1,129 @@
+#include "wavemill/waveform/BigEndian.h"
+
+#include <gtest/gtest.h>
+
+#include <climits>
+#include <string>
+#include <vector>
+
+using namespace Corvane::Wavemill;
+using Bytes = std::vector<unsigned char>;
+
+namespace {
+
+// One row: `value` encodes to exactly `expected`, and decoding `expected`
+// gives the value back and moves the position past it.
+template <typename T> void expectRoundTrip(const char *row, T value, const Bytes &expected) {
+  SCOPED_TRACE(row);
+  auto bytes = std::make_shared<Bytes>();
+  BigEndian::append(bytes, value);
+  EXPECT_EQ(*bytes, expected);
+  Bytes input = expected;
+  T back{};
+  int pos = 0;
+  BigEndian::parse(gsl::make_span(input), &pos, &back);
+  EXPECT_EQ(back, value);
+  EXPECT_EQ(pos, static_cast<int>(expected.size()));
+}
+
+} // namespace
+
+TEST(BigEndianTest, EveryWidthRoundTripsMostSignificantByteFirst) {
+  expectRoundTrip<unsigned char>("unsigned char", 0xA5, {0xA5});
+  expectRoundTrip<char>("char", static_cast<char>(-2), {0xFE});
+  expectRoundTrip<unsigned short>("unsigned short", 0x1234, {0x12, 0x34});
+  expectRoundTrip<unsigned int>("unsigned int", 0x89ABCDEFu, {0x89, 0xAB, 0xCD, 0xEF});
+  expectRoundTrip<float>("float", -1.0f, {0xBF, 0x80, 0x00, 0x00});
+  expectRoundTrip<double>("double", -2.5, {0xC0, 0x04, 0, 0, 0, 0, 0, 0});
+
+  auto bytes = std::make_shared<Bytes>();
+  BigEndian::append(bytes, static_cast<unsigned char>(1), static_cast<unsigned short>(0x0203), std::string("x\0y", 3));
+  EXPECT_EQ(*bytes, (Bytes{0x01, 0x02, 0x03, 'x', 0x00, 'y'})); // a string has no length and no terminator
+}
+
+TEST(BigEndianTest, MakeBlockStoresTheContentLengthInEightBits) {
+  const struct {
+    std::size_t content;
+    unsigned char sizeByte;
+  } rows[] = {{0, 0}, {253, 253}, {255, 255}, {300, 44}};
+  for (const auto &row : rows) {
+    SCOPED_TRACE(row.content);
+    const auto block = BigEndian::makeBlock(7, std::string(row.content, 'a'));
+    ASSERT_EQ(block->size(), row.content + 2);
+    EXPECT_EQ((*block)[0], 7);
+    EXPECT_EQ((*block)[1], row.sizeByte);
+  }
+}
+
+TEST(BigEndianTest, ParseTakesOnlyTheFieldsThatFitAndLeavesTheRest) {
+  Bytes input(15);
+  input[0] = 0x3F, input[1] = 0xF0; // 1.0
+  double a = 5, b = 5, c = 5;
+  int pos = 0;
+  BigEndian::parse(gsl::make_span(input), &pos, &a, &b, &c);
+  EXPECT_EQ(a, 1.0);
+  EXPECT_EQ(b, 5.0);
+  EXPECT_EQ(c, 5.0);
+  EXPECT_EQ(pos, 8);
+
+  // A narrower field behind one that does not fit is still read.
+  unsigned short s = 0;
+  unsigned char u = 0;
+  pos = 12;
+  BigEndian::parse(gsl::make_span(input), &pos, &a, &s, &u);
+  EXPECT_EQ(pos, 15);
+  EXPECT_EQ(a, 1.0);
+
+  Bytes text{'a', 0, 'b', 'c', 'd'};
+  const struct {
+    const char *name;
+    std::string before;
+    int start;
+    std::string after;
+    int end;
+  } strings[] = {
+      {"fixed field inside the span, zero as space", "....", 0, "a bc", 4},
+      {"fixed field ending at the end of the span", "...", 2, "...", 2},
+      {"trailing field takes the rest, position stays", "", 2, "bcd", 2},
+      {"negative position", "", -1, "", -1},
+  };
+  for (const auto &row : strings) {
+    SCOPED_TRACE(row.name);
+    std::string value = row.before;
+    pos = row.start;
+    BigEndian::parse(gsl::make_span(text), &pos, &value);
+    EXPECT_EQ(value, row.after);
+    EXPECT_EQ(pos, row.end);
+  }
+}
+
+TEST(BigEndianTest, ParseBlockSkipsWholeBlocksAndNeverReadsPastTheSpan) {
+  const struct {
+    const char *name;
+    Bytes input;
+    int start;
+    int result;
+    double value;
+    int end;
+  } rows[] = {
+      {"longer block: extra bytes skipped", {9, 0x3F, 0xF0, 0, 0, 0, 0, 0, 0, 0xAA, 0xBB}, 0, 9, 1.0, 10},
+      {"short block: value kept", {4, 0x3F, 0xF0, 0, 0, 0xEE}, 0, 4, 7.0, 5},
+      {"size claims more than is there", {200, 0x3F, 0xF0, 0, 0, 0, 0, 0, 0}, 0, 200, 1.0, 201},
+      {"position at the end", {8}, 1, 0, 7.0, 1},
+      {"negative position", {8}, -3, 0, 7.0, -3},
+  };
+  for (auto row : rows) {
+    SCOPED_TRACE(row.name);
+    double value = 7.0;
+    int pos = row.start;
+    EXPECT_EQ(BigEndian::parseBlock(gsl::make_span(row.input), &pos, &value), row.result);
+    EXPECT_EQ(value, row.value);
+    EXPECT_EQ(pos, row.end);
+  }
+
+  unsigned char one = 0;
+  int pos = 0;
+  unsigned int value = 0;
+  const gsl::span<unsigned char> huge(&one, static_cast<std::size_t>(INT_MAX) + 1);
+  EXPECT_THROW(BigEndian::parse(huge, &pos, &value), gsl::narrowing_error);
+}
