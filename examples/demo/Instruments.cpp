@@ -97,8 +97,8 @@ void instruments() {
   instrument->sendBlock("MMEM:DATA 'demo.wv',", waveform, 4096);
   auto back = instrument->queryBlock("MMEM:DATA? 'demo.wv'", -1);
   instrument->readLine(1000); // the line feed behind the block
-  std::cout << "sent a block of " << waveform.size() << " bytes and read back " << back.size() << " bytes: "
-            << (back == waveform ? "equal" : "DIFFERENT") << "\n";
+  std::cout << "sent a block of " << waveform.size() << " bytes and read back " << back.size()
+            << " bytes: " << (back == waveform ? "equal" : "DIFFERENT") << "\n";
 
   throughVisa(simulator);
 
