@@ -78,6 +78,7 @@
 #include "wavemill/waveform/FileHeader.h"
 #include "wavemill/waveform/FlexibleArbFileHeader.h"
 #include "wavemill/waveform/HdrDescript.h"
+#include "wavemill/waveform/Packager.h"
 #include "wavemill/waveform/Rijndael.h"
 #include "wavemill/waveform/SecureHash.h"
 #include "wavemill/waveform/SwapBytes.h"
