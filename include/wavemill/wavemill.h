@@ -75,6 +75,7 @@
 #include "wavemill/waveform/DynamicBuffer.h"
 #include "wavemill/waveform/EncryptKey.h"
 #include "wavemill/waveform/Encryptor.h"
+#include "wavemill/waveform/Exporter2.h"
 #include "wavemill/waveform/FileHeader.h"
 #include "wavemill/waveform/FlexibleArbFileHeader.h"
 #include "wavemill/waveform/HdrDescript.h"
