@@ -83,3 +83,4 @@
 #include "wavemill/waveform/Rijndael.h"
 #include "wavemill/waveform/SecureHash.h"
 #include "wavemill/waveform/SwapBytes.h"
+#include "wavemill/waveform/exportimport/WaveformHeader.h"
