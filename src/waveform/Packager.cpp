@@ -44,9 +44,11 @@ int bufferBytes(int blocks, int blockSize) {
 }
 
 // Reads behind `writePos` until the buffer is full; true when the reader has
-// nothing more to give.
+// nothing more to give. Never more than the reader's size is taken: a header
+// reader of exactly 16 bytes reports 0 bytes but would still deliver them.
 bool readBehind(const Window &w) {
-  const int wanted = w.bufferSize - w.writePos;
+  const int room = w.bufferSize - w.writePos;
+  const int wanted = w.bytesLeft < room ? (w.bytesLeft > 0 ? w.bytesLeft : 0) : room;
   int got = wanted > 0 ? w.reader->read(w.buffer + w.writePos, 1, wanted) : 0;
   got = got < 0 ? 0 : got > wanted ? wanted : got;
   w.writePos += got;

@@ -130,8 +130,14 @@ TEST(PackagerTest, ForerunnerWritesItsTagInHostOrderAndBadArgumentsDeliverNothin
   std::memcpy(hostTag.data(), &tag, 4);
   EXPECT_EQ(plain, join({hostTag, word(3), body, Bytes(5, 0)}));
 
+  // A header reader over the 16 base bytes alone has a size of 0 but
+  // would still hand those bytes out; they must not become the body.
+  Bytes base = pattern(16, 1);
+  HeaderBuffer_DataReader baseOnly(base.data(), 16);
+  WPL_Packager header(&baseOnly, &encryptor, 1, 256, 16, 0, 0, nullptr);
+  EXPECT_EQ(drain(header, 4), join({word(1), word(0), Bytes(8, 0)}));
+
   unsigned char out[64];
-  Encryptor keyless;
   struct Bad {
     const char *name;
     DataReader *reader;
