@@ -14,18 +14,18 @@
 ///
 /// The file, from its first byte (all numbers big-endian):
 ///
-/// | Offset  | Size                 | Content                               | Key              |
-/// |---------|----------------------|---------------------------------------|------------------|
-/// | 0       | 32                   | header bytes 0-7, salt, 8-15, salt    | `fixedFileKey`   |
-/// | 32      | 8 + H - 16, padded   | package 1: the header from byte 16 on | data key         |
-/// | follows | 8 + 4n, padded       | package 2: 16-bit IQ, I hi, I lo, Q hi, Q lo | data key  |
-/// | follows | 8 + n, padded        | package 3: one marker byte per sample | data key         |
+/// | Offset  | Size               | Content                                      | Key            |
+/// |---------|--------------------|----------------------------------------------|----------------|
+/// | 0       | 32                 | header bytes 0-7, salt, 8-15, salt           | `fixedFileKey` |
+/// | 32      | 8 + H - 16, padded | package 1: the header from byte 16 on        | data key       |
+/// | follows | 8 + 4n, padded     | package 2: 16-bit IQ, I hi, I lo, Q hi, Q lo | data key       |
+/// | follows | 8 + n, padded      | package 3: one marker byte per sample        | data key       |
 ///
 /// Packages are framed and padded to 16 bytes as `WPL_Packager` tells; a
 /// floating-point IQ package has tag 4 and 8 bytes a sample. The data key is
 /// `EncryptKey::generateKey` of the 32 plain head bytes, so a reader derives
-/// it from the head alone. Each salt is 8 copies of the low byte of `rand()`
-/// after `srand(time)`, seeded anew for each, so both salts are equal unless
+/// it from the head alone. Each salt is the low bytes of eight `rand()`
+/// results after `srand(time)`, seeded anew for each, so both are equal unless
 /// the clock ticks in between, and exporters made within one second share
 /// them. This reseeds the process-wide `rand()`.
 ///

@@ -1,0 +1,161 @@
+#include "wavemill/waveform/Exporter2.h"
+
+#include "support/TempDir.h"
+#include "support/WaveformFile.h"
+
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <cstdlib>
+#include <ctime>
+#include <filesystem>
+
+using namespace Corvane::Wavemill;
+using namespace Corvane::Wavemill::Testing;
+
+namespace {
+
+// Exporter2 writes whole waveforms through setData; the streaming half
+// belongs to its subclasses.
+class WholeExporter : public Exporter2 {
+public:
+  using Exporter2::Exporter2;
+  bool start(int64_t, bool) override { return false; }
+  bool start(bool) override { return false; }
+  void stop() override {}
+  bool stream(unsigned char *, unsigned char *, int, bool) override { return false; }
+  bool streamiq(unsigned char *, int) override { return false; }
+  bool streammarker(unsigned char *, int) override { return false; }
+};
+
+std::size_t pad(std::size_t n) { return (n + 15) / 16 * 16; }
+
+Bytes header(int n) {
+  Bytes h(static_cast<std::size_t>(n));
+  for (int k = 0; k < n; ++k) {
+    h[static_cast<std::size_t>(k)] = static_cast<unsigned char>(0xa0 + k);
+  }
+  return h;
+}
+
+// The salt: the low bytes of rand() after srand(t), for a t in [from, to].
+bool saltOfTime(const unsigned char *salt, std::time_t from, std::time_t to) {
+  for (std::time_t t = from; t <= to; ++t) {
+    std::srand(static_cast<unsigned int>(t));
+    bool same = true;
+    for (int k = 0; k < 8; ++k) {
+      same = (salt[k] == static_cast<unsigned char>(std::rand() & 0xff)) && same;
+    }
+    if (same) {
+      return true;
+    }
+  }
+  return false;
+}
+
+} // namespace
+
+TEST(Exporter2Test, FileHoldsHeadHeaderIqAndMarkerPackagesByteForByte) {
+  struct Row {
+    int headerLen, samples, markerCount;
+  } rows[] = {{16, 0, 0}, {40, 3, 2}, {23, 17, 6}, {100, 1000, 4}};
+  for (const Row &row : rows) {
+    SCOPED_TRACE("header " + std::to_string(row.headerLen) + ", samples " + std::to_string(row.samples));
+    TempDir dir;
+    Bytes h = header(row.headerLen);
+    std::vector<double> i(static_cast<std::size_t>(row.samples)), q(i.size());
+    Bytes markers(i.size() * static_cast<std::size_t>(row.markerCount));
+    for (std::size_t s = 0; s < i.size(); ++s) {
+      i[s] = std::sin(0.1 * static_cast<double>(s)) * 0.3;
+      q[s] = std::cos(0.1 * static_cast<double>(s)) * 0.2;
+    }
+    for (std::size_t k = 0; k < markers.size(); ++k) {
+      markers[k] = static_cast<unsigned char>(k % 3 == 0 ? 0 : k);
+    }
+    const std::time_t before = std::time(nullptr);
+    WholeExporter exporter(dir.path("w.wv"), h.data(), row.headerLen);
+    EXPECT_TRUE(exporter.setData(i.data(), q.data(), markers.data(), row.samples, row.markerCount));
+    const std::time_t after = std::time(nullptr);
+    const WaveformFile file = openWaveform(dir.path("w.wv"));
+    const auto n = static_cast<std::size_t>(row.samples);
+    ASSERT_EQ(file.size, 32 + pad(8 + h.size() - 16) + pad(8 + 4 * n) + pad(8 + n));
+    EXPECT_EQ(Bytes(file.head.begin(), file.head.begin() + 8), Bytes(h.begin(), h.begin() + 8));
+    EXPECT_EQ(Bytes(file.head.begin() + 16, file.head.begin() + 24), Bytes(h.begin() + 8, h.begin() + 16));
+    EXPECT_TRUE(saltOfTime(&file.head[8], before, after));
+    EXPECT_TRUE(saltOfTime(&file.head[24], before, after));
+    ASSERT_EQ(file.packages.size(), 3u);
+    Bytes iq, packed(n);
+    double peak = 0;
+    for (std::size_t s = 0; s < n; ++s) {
+      peak = std::max({peak, std::fabs(i[s]), std::fabs(q[s])});
+    }
+    for (std::size_t s = 0; s < n; ++s) {
+      for (double v : {i[s] / peak, q[s] / peak}) {
+        const auto word = static_cast<std::uint16_t>(static_cast<std::int16_t>(std::lround(v * 32767.0)));
+        iq.insert(iq.end(), {static_cast<unsigned char>(word >> 8), static_cast<unsigned char>(word)});
+      }
+      for (std::size_t c = 0; c < 4 && c < static_cast<std::size_t>(row.markerCount); ++c) {
+        packed[s] |= markers[s * static_cast<std::size_t>(row.markerCount) + c] != 0 ? 1 << c : 0;
+      }
+    }
+    const Bytes bodies[] = {Bytes(h.begin() + 16, h.end()), iq, packed};
+    for (std::uint32_t tag = 1; tag <= 3; ++tag) {
+      const Package &p = file.packages[tag - 1];
+      EXPECT_EQ(p.tag, tag);
+      EXPECT_EQ(p.length, bodies[tag - 1].size());
+      EXPECT_EQ(p.body, bodies[tag - 1]);
+      EXPECT_TRUE(p.zeroPadded);
+    }
+  }
+}
+
+TEST(Exporter2Test, SamplesRoundToSixteenBitsAndBadInputIsRefused) {
+  TempDir dir;
+  Bytes h = header(16);
+  WholeExporter exporter(dir.path("w.wv"), h.data(), 16);
+  double i[] = {2.0, -2.0, 1.0, 0.5, NAN, 0.0};
+  double q[] = {0.0, 1.0, -1.0, 0.00001, 0.0, -0.0};
+  unsigned char markers[] = {1, 0, 1, 0, 9, 9, 0, 0, 0, 0, 0, 0, 0, 0, 0, 1, 0, 0};
+  EXPECT_FALSE(exporter.setData(nullptr, q, nullptr, 6, 0));
+  EXPECT_FALSE(exporter.setData(i, q, nullptr, 6, 3));
+  EXPECT_FALSE(exporter.setData(i, q, nullptr, -1, 0));
+  EXPECT_FALSE(exporter.setData(i, q, nullptr, 1 << 29, 0));
+  EXPECT_EQ(std::filesystem::file_size(dir.path("w.wv")), 0u);
+
+  EXPECT_TRUE(exporter.setData(i, q, markers, 6, 3));
+  const Bytes written = readBytes(dir.path("w.wv"));
+  EXPECT_FALSE(exporter.setData(i, q, markers, 6, 3)); // one waveform per exporter
+  EXPECT_EQ(readBytes(dir.path("w.wv")), written);
+  const WaveformFile file = openWaveform(dir.path("w.wv"));
+  ASSERT_EQ(file.packages.size(), 3u);
+  const Bytes iq = {0x7f, 0xff, 0x00, 0x00, 0x80, 0x01, 0x40, 0x00, 0x40, 0x00, 0xc0, 0x00,
+                    0x20, 0x00, 0x00, 0x00, 0x00, 0x00, 0x00, 0x00, 0x00, 0x00, 0x00, 0x00};
+  EXPECT_EQ(file.packages[1].body, iq); // 1 -> 32767, -1 -> -32767, 0.5 -> 16384, NaN -> 0
+  EXPECT_EQ(file.packages[2].body, Bytes({0x05, 0x06, 0x00, 0x00, 0x00, 0x01}));
+
+  double zeros[2] = {0.0, 0.0};
+  WholeExporter silent(dir.path("zero.wv"), h.data(), 16);
+  EXPECT_TRUE(silent.setData(zeros, zeros, nullptr, 2, 0));
+  EXPECT_EQ(openWaveform(dir.path("zero.wv")).packages[1].body, Bytes(8, 0));
+}
+
+TEST(Exporter2Test, UnwritableTargetLeavesNoFileAndShortHeaderIsPadded) {
+  TempDir dir;
+  Bytes h = header(16);
+  double v[1] = {1.0};
+  for (const std::string &target : {dir.path("missing/w.wv"), dir.root()}) {
+    SCOPED_TRACE(target);
+    WholeExporter exporter(target, h.data(), 16);
+    EXPECT_TRUE(exporter.failed());
+    EXPECT_TRUE(exporter.setData(v, v, nullptr, 1, 0));
+    EXPECT_FALSE(std::filesystem::exists(dir.path("missing")));
+  }
+  EXPECT_TRUE(std::filesystem::is_directory(dir.root()));
+
+  WholeExporter shortHeader(dir.path("s.wv"), h.data(), 5);
+  EXPECT_TRUE(shortHeader.setData(v, v, nullptr, 1, 0));
+  const WaveformFile file = openWaveform(dir.path("s.wv"));
+  EXPECT_EQ(Bytes(file.head.begin(), file.head.begin() + 8), Bytes({0xa0, 0xa1, 0xa2, 0xa3, 0xa4, 0, 0, 0}));
+  ASSERT_EQ(file.packages.size(), 3u);
+  EXPECT_EQ(file.packages[0].length, 0u);
+}
