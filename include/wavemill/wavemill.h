@@ -83,6 +83,7 @@
 #include "wavemill/waveform/Packager.h"
 #include "wavemill/waveform/Rijndael.h"
 #include "wavemill/waveform/SecureHash.h"
+#include "wavemill/waveform/StreamingExporter2.h"
 #include "wavemill/waveform/StreamingImporter2.h"
 #include "wavemill/waveform/SwapBytes.h"
 #include "wavemill/waveform/exportimport/WaveformHeader.h"
