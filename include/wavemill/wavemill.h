@@ -77,6 +77,7 @@
 #include "wavemill/waveform/Encryptor.h"
 #include "wavemill/waveform/Exporter2.h"
 #include "wavemill/waveform/FileHeader.h"
+#include "wavemill/waveform/FlatInterface.h"
 #include "wavemill/waveform/FlexibleArbFileHeader.h"
 #include "wavemill/waveform/HdrDescript.h"
 #include "wavemill/waveform/Importer2.h"
