@@ -9,6 +9,7 @@
 #include <cstdlib>
 #include <cstring>
 #include <ctime>
+#include <new>
 #include <vector>
 
 using Corvane::Wavemill::Buffer_DataReader;
@@ -25,6 +26,50 @@ constexpr int headBytes = 32;
 constexpr int blockBytes = 16;
 // The most samples whose 4-byte IQ form an int can count.
 constexpr int maxSamples = INT_MAX / 4;
+// The stdio buffer of the target: the file gets 1024-byte writes, which
+// would otherwise become as many system calls as the default buffer allows.
+constexpr std::size_t streamBufferBytes = 1 << 18;
+
+// A sample value as stored: +-0.5 unless truncating, then truncated toward
+// zero, keeping the low 16 bits. NaN gives 0, and clamping first keeps the
+// conversion defined for any magnitude.
+inline std::uint16_t quantise(double value, bool truncate) {
+  if (std::isnan(value)) {
+    return 0;
+  }
+  if (!truncate) {
+    value += value < 0.0 ? -0.5 : 0.5;
+  }
+  value = std::min(std::max(value, -9.0e18), 9.0e18);
+  return static_cast<std::uint16_t>(static_cast<std::int64_t>(value));
+}
+
+// `quantise` for values scaled from -1..1, where a 32-bit conversion loses
+// nothing and vectorises; others (a derived normalize may give any) take the
+// general way.
+inline std::uint16_t quantiseScaled(double value, bool truncate) {
+  if (!(value > -2.0e9 && value < 2.0e9)) {
+    return quantise(value, truncate);
+  }
+  if (!truncate) {
+    value += value < 0.0 ? -0.5 : 0.5;
+  }
+  return static_cast<std::uint16_t>(static_cast<std::int32_t>(value));
+}
+
+struct FreeDeleter {
+  void operator()(double *p) const { std::free(p); }
+};
+
+// Zeroed doubles; calloc gets large blocks as fresh zero pages, without
+// the memset of a value-initialised new[].
+std::unique_ptr<double[], FreeDeleter> zeroedDoubles(std::size_t n) {
+  auto *p = static_cast<double *>(std::calloc(n == 0 ? 1 : n, sizeof(double)));
+  if (p == nullptr) {
+    throw std::bad_alloc();
+  }
+  return std::unique_ptr<double[], FreeDeleter>(p);
+}
 
 } // namespace
 
@@ -73,30 +118,29 @@ int64_t Exporter2::getPkgSize() { return 0; }
 int Exporter2::pkgTag() { return static_cast<int>(pkgState); }
 
 void Exporter2::normalize(const double *i, const double *q, double *outI, double *outQ, int n) {
-  double peak = 0.0;
-  for (int k = 0; k < n; ++k) {
-    peak = std::max({peak, std::fabs(i[k]), std::fabs(q[k])});
+  // Four running maxima break the chain of dependent comparisons; NaN
+  // never compares greater, so it is skipped as with one.
+  double peaks[4] = {0.0, 0.0, 0.0, 0.0};
+  int k = 0;
+  for (; k + 2 <= n; k += 2) {
+    peaks[0] = std::max(peaks[0], std::fabs(i[k]));
+    peaks[1] = std::max(peaks[1], std::fabs(q[k]));
+    peaks[2] = std::max(peaks[2], std::fabs(i[k + 1]));
+    peaks[3] = std::max(peaks[3], std::fabs(q[k + 1]));
   }
+  for (; k < n; ++k) {
+    peaks[0] = std::max({peaks[0], std::fabs(i[k]), std::fabs(q[k])});
+  }
+  const double peak = std::max({peaks[0], peaks[1], peaks[2], peaks[3]});
   if (peak > 0.0) {
-    for (int k = 0; k < n; ++k) {
+    for (k = 0; k < n; ++k) {
       outI[k] = i[k] / peak;
       outQ[k] = q[k] / peak;
     }
   }
 }
 
-short Exporter2::round(double value) const {
-  if (std::isnan(value)) {
-    return 0;
-  }
-  if (truncateSamples == 0) {
-    value += value < 0.0 ? -0.5 : 0.5;
-  }
-  // Only the low 16 bits are kept; clamping first keeps the conversion
-  // defined for any magnitude.
-  value = std::clamp(value, -9.0e18, 9.0e18);
-  return static_cast<short>(static_cast<std::uint16_t>(static_cast<std::int64_t>(value)));
-}
+short Exporter2::round(double value) const { return static_cast<short>(quantise(value, truncateSamples != 0)); }
 
 bool Exporter2::convertData(double *i, double *q, unsigned char *markers, int samples, int markerCount) {
   if (samples < 0 || samples > maxSamples || markerCount < 0 ||
@@ -104,15 +148,18 @@ bool Exporter2::convertData(double *i, double *q, unsigned char *markers, int sa
     return false;
   }
   const auto n = static_cast<std::size_t>(samples);
-  // The outputs start as copies: with a peak of 0 normalize leaves them
-  // alone, and the samples then go out unscaled.
-  std::vector<double> outI(i, i + n);
-  std::vector<double> outQ(q, q + n);
-  normalize(i, q, outI.data(), outQ.data(), samples);
-  auto iq = std::make_unique<unsigned char[]>(n * 4);
+  // With a peak of 0 normalize leaves its outputs alone. Such input is all
+  // zeros (or NaN, which is stored as 0), so zeroed outputs give the
+  // samples unscaled.
+  const auto outI = zeroedDoubles(n);
+  const auto outQ = zeroedDoubles(n);
+  normalize(i, q, outI.get(), outQ.get(), samples);
+  // Every byte is written below, so the array is not value-initialised.
+  std::unique_ptr<unsigned char[]> iq(new unsigned char[n * 4]);
+  const bool truncate = truncateSamples != 0;
   for (std::size_t s = 0; s < n; ++s) {
-    const auto iValue = static_cast<std::uint16_t>(round(outI[s] * 32767.0));
-    const auto qValue = static_cast<std::uint16_t>(round(outQ[s] * 32767.0));
+    const std::uint16_t iValue = quantiseScaled(outI[s] * 32767.0, truncate);
+    const std::uint16_t qValue = quantiseScaled(outQ[s] * 32767.0, truncate);
     iq[4 * s] = static_cast<unsigned char>(iValue >> 8);
     iq[4 * s + 1] = static_cast<unsigned char>(iValue);
     iq[4 * s + 2] = static_cast<unsigned char>(qValue >> 8);
@@ -284,6 +331,12 @@ uint64_t Exporter2::readEncryptedData(unsigned char *dest, uint64_t size) {
 void Exporter2::appendEncryptedData(const std::string &path) {
   std::FILE *file = writeFailed ? nullptr : std::fopen(path.c_str(), "ab");
   bool written = writeFailed || file != nullptr;
+  if (file != nullptr) {
+    if (!streamBuffer) {
+      streamBuffer = std::make_unique<char[]>(streamBufferBytes);
+    }
+    std::setvbuf(file, streamBuffer.get(), _IOFBF, streamBufferBytes);
+  }
   for (;;) {
     const uint64_t got = readEncryptedData(fileBuffer.get(), bufferBytes);
     if (got == 0) {

@@ -157,4 +157,5 @@ protected:
   unsigned int pkgState = 0;
   bool tagWritten[5] = {};
   bool writeFailed = false;
+  std::unique_ptr<char[]> streamBuffer; // stdio buffer of the file being appended to
 };
