@@ -123,7 +123,7 @@ private:
       throw ToolError(context + ": the connection was lost");
     } catch (const ApplicationException &error) {
       // The VISA layer's own description of the failure.
-      throw ToolError(context + ": " + error.getMessage());
+      throw ToolError(context + ": " + std::string(trim(error.getMessage())));
     } catch (const std::exception &) {
       throw ToolError(context);
     }

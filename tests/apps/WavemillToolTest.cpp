@@ -1,0 +1,352 @@
+// The wavemill program, run as a user runs it: through a shell, with real
+// files in a temporary folder and a simulated instrument on 127.0.0.1.
+#include "support/TempDir.h"
+
+#include "wavemill/simulator/SimulatedInstrument.h"
+#include "wavemill/tools/Tools.h"
+
+#include <gtest/gtest.h>
+
+#include <charconv>
+#include <cmath>
+#include <cstdint>
+#include <cstring>
+#include <fstream>
+#include <iterator>
+#include <string>
+#include <vector>
+
+namespace Corvane::Wavemill {
+namespace {
+
+using Testing::TempDir;
+
+std::string readAll(const std::string &path) {
+  std::ifstream in(path, std::ios::binary);
+  return std::string(std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>());
+}
+
+void writeAll(const std::string &path, const std::string &bytes) { std::ofstream(path, std::ios::binary) << bytes; }
+
+std::string quote(const std::string &text) {
+  std::string out = "'";
+  for (const char c : text)
+    out += c == '\'' ? std::string("'\\''") : std::string(1, c);
+  return out + "'";
+}
+
+struct Result {
+  int code = -1;
+  std::string out;
+  std::string err;
+};
+
+// Runs a shell command line in `dir` with the tool first on PATH, so that
+// "wavemill ..." is the program under test, and collects what it printed.
+Result run(const TempDir &dir, const std::string &commandLine) {
+  const std::string tool = WAVEMILL_TOOL;
+  const std::string script = "cd " + quote(dir.root()) + " && PATH=" + quote(tool.substr(0, tool.rfind('/'))) +
+                             ":$PATH && export PATH && " + commandLine + " > .out 2> .err; echo $? > .rc";
+  EXPECT_EQ(Tools::startProcess("/bin/sh -c " + quote(script), 120000), 0);
+  Result result;
+  const std::string rc = readAll(dir.path(".rc"));
+  std::from_chars(rc.data(), rc.data() + rc.size(), result.code);
+  result.out = readAll(dir.path(".out"));
+  result.err = readAll(dir.path(".err"));
+  std::remove(dir.path(".rc").c_str());
+  return result;
+}
+
+std::string number(double value) {
+  char text[32];
+  return std::string(text, std::to_chars(text, text + sizeof text, value).ptr);
+}
+
+// I, Q in -1..1 and the marker bits of each sample.
+struct Samples {
+  std::vector<double> i, q;
+  std::vector<int> markers;
+};
+
+Samples makeSamples(int count) {
+  Samples s;
+  for (int n = 0; n < count; ++n) {
+    s.i.push_back(std::sin(n * 0.01));
+    s.q.push_back(n % 7 == 0 ? -1.0 : std::cos(n * 0.01) * 0.5);
+    s.markers.push_back(n % 16);
+  }
+  return s;
+}
+
+template <class T> void putLittleEndian(std::string &out, T value) {
+  char bytes[sizeof(T)];
+  std::memcpy(bytes, &value, sizeof(T)); // the test machine is little-endian, as the raw formats are
+  out.append(bytes, sizeof(T));
+}
+
+template <class T> double takeLittleEndian(const std::string &bytes, std::size_t &at) {
+  T value;
+  std::memcpy(&value, bytes.data() + at, sizeof(T));
+  at += sizeof(T);
+  return static_cast<double>(value);
+}
+
+// The samples in one of the tool's formats; markers in a CSV column when
+// `markerColumn`.
+std::string encode(const Samples &s, const std::string &format, bool markerColumn) {
+  std::string out;
+  for (std::size_t n = 0; n < s.i.size(); ++n) {
+    if (format == "csv") {
+      out += number(s.i[n]) + "," + number(s.q[n]) + (markerColumn ? "," + number(s.markers[n]) : "") + "\n";
+      continue;
+    }
+    for (const double value : {s.i[n], s.q[n]}) {
+      if (format == "f32")
+        putLittleEndian(out, static_cast<float>(value));
+      else if (format == "f64")
+        putLittleEndian(out, value);
+      else
+        putLittleEndian(out, static_cast<std::int16_t>(std::lround(value * 32767)));
+    }
+  }
+  return out;
+}
+
+Samples decode(const std::string &bytes, const std::string &format) {
+  Samples s;
+  std::size_t at = format == "csv" ? bytes.find('\n') + 1 : 0; // after the heading
+  while (at < bytes.size()) {
+    double value[3] = {0, 0, 0};
+    for (int field = 0; field < (format == "csv" ? 3 : 2); ++field) {
+      if (format == "csv") {
+        at = std::from_chars(bytes.data() + at, bytes.data() + bytes.size(), value[field]).ptr - bytes.data() + 1;
+        if (bytes[at - 1] == '\n')
+          break;
+      } else if (format == "f32") {
+        value[field] = takeLittleEndian<float>(bytes, at);
+      } else if (format == "f64") {
+        value[field] = takeLittleEndian<double>(bytes, at);
+      } else {
+        value[field] = takeLittleEndian<std::int16_t>(bytes, at) / 32767.0;
+      }
+    }
+    s.i.push_back(value[0]);
+    s.q.push_back(value[1]);
+    s.markers.push_back(static_cast<int>(value[2]));
+  }
+  return s;
+}
+
+std::string markerLines(const std::vector<int> &markers) {
+  std::string out;
+  for (const int m : markers)
+    out += number(m) + "\n";
+  return out;
+}
+
+TEST(WavemillToolTest, PackInfoUnpackRoundTripCsvAndRawSamples) {
+  struct Row {
+    const char *name;
+    const char *packLine;
+    const char *unpackLine;
+    const char *format;
+    bool markers;
+    const char *storedAs;
+    double tolerance;
+  };
+  const Row rows[] = {
+      {"csv with a marker column", "wavemill wv pack in.csv out.wv --set tag5=demo", "wavemill wv unpack out.wv -",
+       "csv", true, "integer", 0.51 / 32767},
+      {"f32 with a marker file", "wavemill wv pack -f f32 in.f32 out.wv -m in.mkr",
+       "wavemill wv unpack -f f32 out.wv back.f32 -m back.mkr", "f32", true, "integer", 0.51 / 32767},
+      {"i16 from standard input", "cat in.i16 | wavemill wv pack -f i16 - out.wv", "wavemill wv unpack -f i16 out.wv -",
+       "i16", false, "integer", 0.51 / 32767},
+      {"f64 stored as float", "wavemill wv pack -f f64 --float in.f64 out.wv", "wavemill wv unpack -f f64 out.wv -",
+       "f64", false, "float", 1e-7},
+  };
+  const Samples samples = makeSamples(5003);
+  for (const auto &row : rows) {
+    SCOPED_TRACE(row.name);
+    TempDir dir;
+    const std::string format = row.format;
+    writeAll(dir.path("in." + format), encode(samples, format, row.markers && format == "csv"));
+    writeAll(dir.path("in.mkr"), markerLines(samples.markers));
+
+    const Result pack = run(dir, row.packLine);
+    ASSERT_EQ(pack.code, 0) << pack.err;
+    EXPECT_EQ(pack.err, ""); // no progress bar: standard error is a file
+
+    const Result info = run(dir, "wavemill wv info out.wv");
+    ASSERT_EQ(info.code, 0) << info.err;
+    EXPECT_NE(info.out.find("samples        5003\n"), std::string::npos) << info.out;
+    EXPECT_NE(info.out.find(std::string("format         ") + row.storedAs + "\n"), std::string::npos);
+    EXPECT_NE(info.out.find(row.markers ? "markers        present\n" : "markers        absent\n"), std::string::npos);
+    const Result json = run(dir, "wavemill wv info --json out.wv");
+    EXPECT_NE(json.out.find("\"samples\": 5003,"), std::string::npos) << json.out;
+    EXPECT_NE(json.out.find("\"tag5\": \"" + std::string(format == "csv" ? "demo  " : "      ")), std::string::npos);
+
+    const Result unpack = run(dir, row.unpackLine);
+    ASSERT_EQ(unpack.code, 0) << unpack.err;
+    const Samples back = decode(format == "f32" ? readAll(dir.path("back.f32")) : unpack.out, format);
+    ASSERT_EQ(back.i.size(), samples.i.size());
+    for (std::size_t n = 0; n < back.i.size(); ++n) {
+      ASSERT_NEAR(back.i[n], samples.i[n], row.tolerance) << "sample " << n;
+      ASSERT_NEAR(back.q[n], samples.q[n], row.tolerance) << "sample " << n;
+    }
+    if (format == "csv") {
+      EXPECT_EQ(back.markers, samples.markers);
+    } else if (format == "f32") {
+      EXPECT_EQ(readAll(dir.path("back.mkr")), markerLines(samples.markers));
+    }
+  }
+}
+
+TEST(WavemillToolTest, FailuresExplainThemselvesInOneLineAndLeaveNoOutput) {
+  struct Row {
+    const char *commandLine;
+    int code;
+    const char *message;
+  };
+  const Row rows[] = {
+      {"wavemill wv pack missing.csv out.wv", 1, "wavemill: cannot open missing.csv: No such file or directory\n"},
+      {"wavemill wv pack bad.csv out.wv", 1, "wavemill: bad.csv:4: not a number: 'x'\n"},
+      {"wavemill wv pack loud.csv out.wv", 1, "wavemill: loud.csv:2: value outside -1..1 (use --normalize"},
+      {"wavemill wv pack good.csv out.wv -m short.mkr", 1, "wavemill: short.mkr holds fewer marker values"},
+      {"wavemill wv pack good.csv no/such/folder/out.wv", 1, "wavemill: cannot create no/such/folder/out.wv: "},
+      {"wavemill wv info good.csv", 1, "wavemill: good.csv is not a waveform file\n"},
+      {"wavemill wv unpack missing.wv out.csv", 1, "wavemill: cannot open missing.wv: No such file or directory\n"},
+      {"wavemill wv pack good.csv", 2, "wavemill: OUT is required\n"},
+      {"wavemill wv pack good.csv out.wv --format wav", 2, "wavemill: --format: "},
+      {"wavemill wv pack good.csv out.wv --set nope=1", 2, "wavemill: --set: no header field called 'nope'"},
+      {"wavemill wv pack good.csv out.wv --set tag7=256", 2, "wavemill: --set tag7: expected an integer from 0 to"},
+      {"wavemill frobnicate", 2, "wavemill: 'frobnicate' is no wavemill command\n"},
+      {"wavemill sim --fault wobble", 2, "wavemill: --fault: unknown mode 'wobble'"},
+  };
+  TempDir dir;
+  writeAll(dir.path("good.csv"), "I,Q\n0.5,0.25\n-1,1\n");
+  writeAll(dir.path("bad.csv"), "0.5,0.25\n\n0.1,0.2\n0.3,x\n");
+  writeAll(dir.path("loud.csv"), "0.5,0.25\n1.5,0\n");
+  writeAll(dir.path("short.mkr"), "1\n");
+  for (const auto &row : rows) {
+    SCOPED_TRACE(row.commandLine);
+    const Result result = run(dir, row.commandLine);
+    EXPECT_EQ(result.code, row.code);
+    EXPECT_EQ(result.err.rfind(row.message, 0), 0u) << result.err;
+    EXPECT_EQ(result.out, "");
+    EXPECT_FALSE(Tools::exist(dir.path("out.wv")) || Tools::exist(dir.path("out.wv.part")) ||
+                 Tools::exist(dir.path("out.csv")));
+  }
+}
+
+TEST(WavemillToolTest, DrawsProgressOnlyOnATerminalAndNotWithQuiet) {
+  // The input arrives in two parts a second apart, so the transfer outlasts
+  // the half second before a bar is drawn.
+  const std::string pack = "(head -c 400000 in.i16; sleep 1; tail -c +400001 in.i16) | wavemill wv pack -f i16 - ";
+  struct Row {
+    std::string commandLine;
+    bool drawn;
+  };
+  const Row rows[] = {
+      {"script -qec " + quote(pack + "tty.wv") + " /dev/null", true}, // or the other rows prove nothing
+      {"script -qec " + quote(pack + "quiet.wv --quiet") + " /dev/null", false},
+      {pack + "file.wv", false},
+  };
+  TempDir dir;
+  writeAll(dir.path("in.i16"), encode(makeSamples(200000), "i16", false));
+  for (const auto &row : rows) {
+    SCOPED_TRACE(row.commandLine);
+    const Result result = run(dir, row.commandLine);
+    EXPECT_EQ(result.code, 0) << result.err;
+    // Under `script` the program's standard error is the terminal whose
+    // output lands in .out.
+    EXPECT_EQ((result.out + result.err).find("\rreading  ") != std::string::npos, row.drawn) << result.out;
+  }
+}
+
+TEST(WavemillToolTest, ScpiIdentifyAndBlocksAgainstTheSimulatedInstrument) {
+  SimulatedInstrument simulator;
+  const std::string address = simulator.getAddress();
+  const std::string visa = "CORVISA_INSTR_PORT=" + std::to_string(simulator.getPort()) +
+                           " WAVEMILL_VISA_LIBRARY=" + WAVEMILL_CORVISA_LIBRARY + " ";
+  struct Row {
+    std::string commandLine;
+    std::string out;
+  };
+  const Row rows[] = {
+      {"wavemill scpi " + address + " '*IDN?' 'FREQ 2e9' 'FREQ?'", "Corvane,SG200,100123,1.4.2\n2e9\n"},
+      {visa + "wavemill scpi TCPIP0::127.0.0.1::inst0::INSTR 'POW -20' 'POW?'", "-20\n"},
+      {"wavemill identify " + address,
+       "address       " + address +
+           "\nidentity      Corvane,SG200,100123,1.4.2\nmanufacturer  Corvane\nmodel         SG200\n"
+           "serial        100123\nfirmware      1.4.2\noptions       B10,B22,K20,K24\n"},
+      {"wavemill identify --json " + address,
+       "{\n  \"address\": \"" + address +
+           "\",\n  \"identity\": \"Corvane,SG200,100123,1.4.2\",\n  \"manufacturer\": \"Corvane\",\n"
+           "  \"model\": \"SG200\",\n  \"serial\": \"100123\",\n  \"firmware\": \"1.4.2\",\n"
+           "  \"options\": \"B10,B22,K20,K24\"\n}\n"},
+      {"wavemill scpi " + address + " --block up.bin \"MMEM:DATA 'w'\" --read-block down.bin \"MMEM:DATA? 'w'\"", ""},
+      {visa + "wavemill scpi TCPIP0::127.0.0.1::inst0::INSTR --read-block visa.bin \"MMEM:DATA? 'w'\"", ""},
+  };
+  TempDir dir;
+  std::string block;
+  for (int n = 0; n < 300000; ++n)
+    block += static_cast<char>(n * 7919 >> 3);
+  writeAll(dir.path("up.bin"), block);
+  for (const auto &row : rows) {
+    SCOPED_TRACE(row.commandLine);
+    const Result result = run(dir, row.commandLine);
+    EXPECT_EQ(result.code, 0) << result.err;
+    EXPECT_EQ(result.out, row.out);
+    EXPECT_EQ(result.err, "");
+  }
+  const auto stored = simulator.getBlock("w");
+  EXPECT_EQ(std::string(stored.begin(), stored.end()), block);
+  EXPECT_EQ(readAll(dir.path("down.bin")), block);
+  EXPECT_EQ(readAll(dir.path("visa.bin")), block);
+}
+
+TEST(WavemillToolTest, InstrumentFailuresAndFindNameTheAddressOrTheCause) {
+  SimulatedInstrument simulator;
+  const std::string address = simulator.getAddress();
+  std::string closed;
+  {
+    SimulatedInstrument gone; // a port that was free a moment ago and now refuses
+    closed = gone.getAddress();
+  }
+  const std::string corvisa = std::string("WAVEMILL_VISA_LIBRARY=") + WAVEMILL_CORVISA_LIBRARY +
+                              " CORVISA_RESOURCES='TCPIP0::127.0.0.1::inst0::INSTR;ASRL1::INSTR' ";
+  struct Row {
+    std::string commandLine;
+    int code;
+    std::string out;
+    std::string err;
+  };
+  const Row rows[] = {
+      {corvisa + "wavemill find", 0, "TCPIP0::127.0.0.1::inst0::INSTR\nASRL1::INSTR\n", ""},
+      {corvisa + "wavemill find 'ASRL?*'", 0, "ASRL1::INSTR\n", ""},
+      {corvisa + "wavemill find 'GPIB?*'", 1, "", "wavemill: no VISA resources match GPIB?* (wavemill find '?*' "},
+      {"WAVEMILL_VISA_LIBRARY=/nonexistent/libvisa.so wavemill find", 1, "",
+       "wavemill: no VISA resources found (is a VISA library installed? see WAVEMILL_VISA_LIBRARY)\n"},
+      {"wavemill scpi -t 1000 " + closed + " '*IDN?'", 1, "", "wavemill: cannot connect to " + closed + "\n"},
+      {"wavemill identify -t 1000 " + closed, 1, "", "wavemill: cannot connect to " + closed + "\n"},
+      {"wavemill scpi -t 300 " + address + " 'FREQ 1e9' 'NOPE?'", 1, "",
+       "wavemill: no answer to 'NOPE?' from " + address + " within 300 ms\n"},
+      {"wavemill scpi " + address + " --block missing.bin 'MMEM:DATA \"w\"'", 1, "",
+       "wavemill: cannot open missing.bin: No such file or directory\n"},
+      {"wavemill scpi " + address, 2, "", "wavemill: COMMAND is required\n"},
+      {"wavemill scpi " + address + " --read-block x.bin 'FREQ 1e9'", 2, "", "wavemill: --read-block needs a query"},
+      {"wavemill identify TCPIP0::127.0.0.1::99999999999::SOCKET", 2, "", "wavemill: not an instrument address: "},
+  };
+  TempDir dir;
+  for (const auto &row : rows) {
+    SCOPED_TRACE(row.commandLine);
+    const Result result = run(dir, row.commandLine);
+    EXPECT_EQ(result.code, row.code);
+    EXPECT_EQ(result.out, row.out);
+    EXPECT_EQ(result.err.rfind(row.err, 0), 0u) << result.err;
+  }
+  EXPECT_EQ(simulator.getValue("FREQ"), "1e9"); // the command before the failed query went through
+}
+
+} // namespace
+} // namespace Corvane::Wavemill
