@@ -21,8 +21,11 @@ test: bootstrap
 
 demo: bootstrap
 	cmake --preset dev
-	cmake --build --preset dev -j 2 --target wavemill_demo
+	cmake --build --preset dev -j 2 --target wavemill_demo wavemill_tool
 	build/dev/examples/wavemill_demo
+	@printf '%s\n' "Next, the wavemill tool (--help everywhere):  build/dev/apps/wavemill sim &" \
+	  "  build/dev/apps/wavemill identify 127.0.0.1    build/dev/apps/wavemill scpi 127.0.0.1 'FREQ 2e9' 'FREQ?'" \
+	  "  printf '0,0\\n1,0\\n' | build/dev/apps/wavemill wv pack - tone.wv && build/dev/apps/wavemill wv info tone.wv"
 
 asan: bootstrap
 	cmake --preset asan
