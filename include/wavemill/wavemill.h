@@ -87,4 +87,7 @@
 #include "wavemill/waveform/StreamingExporter2.h"
 #include "wavemill/waveform/StreamingImporter2.h"
 #include "wavemill/waveform/SwapBytes.h"
+#include "wavemill/waveform/exportimport/IWaveformPackage.h"
 #include "wavemill/waveform/exportimport/WaveformHeader.h"
+#include "wavemill/waveform/exportimport/WaveformImporter.h"
+#include "wavemill/waveform/exportimport/WaveformPackage.h"
