@@ -1,0 +1,137 @@
+#include "wavemill/waveform/exportimport/WaveformPackage.h"
+#include "wavemill/waveform/exportimport/WaveformImporter.h"
+
+#include "wavemill/tools/Tools.h"
+#include "wavemill/waveform/StreamingImporter2.h"
+
+#include "support/TempDir.h"
+#include "support/WaveformFiles.h"
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <filesystem>
+#include <functional>
+#include <iterator>
+#include <string>
+#include <utility>
+
+using namespace Corvane::Wavemill;
+using namespace Corvane::Wavemill::ExportImport;
+using namespace Corvane::Wavemill::Testing;
+
+namespace {
+
+// IQ and markers in chunks of `chunk` samples, each IQ chunk before its
+// markers, then `end`.
+void writeChunks(WaveformPackage &package, Bytes &iq, Bytes &markers, std::size_t chunk) {
+  for (std::size_t at = 0; at < markers.size(); at += chunk) {
+    const std::size_t n = std::min(chunk, markers.size() - at);
+    EXPECT_TRUE(package.append(gsl::span<unsigned char>(iq.data() + 4 * at, 4 * n)));
+    EXPECT_TRUE(package.appendMarker(std::make_shared<Bytes>(markers.begin() + at, markers.begin() + at + n)));
+  }
+  package.end();
+}
+
+// Everything the streaming importer delivers, read in pieces of 64 KiB.
+Bytes readAll(const std::function<int(unsigned char *, int)> &read, std::size_t total) {
+  Bytes got(total);
+  for (std::size_t at = 0; at < total; at += 1 << 16) {
+    const auto n = static_cast<int>(std::min<std::size_t>(1 << 16, total - at));
+    EXPECT_EQ(read(got.data() + at, n), n);
+  }
+  return got;
+}
+
+} // namespace
+
+TEST(WaveformPackageTest, MillionSamplesInChunksComeBackWithTheWholeHeaderAndTheirMarkers) {
+  TempDir dir;
+  const std::string file = dir.path("wave.wv");
+  auto iq = patternBytes(4'000'000, 7);
+  auto markers = patternBytes(1'000'000, 8);
+  for (auto &m : markers) {
+    m &= 0x0f;
+  }
+  WaveformPackage package;
+  package.setFileName(file);
+  auto header = package.getWaveformHeader();
+  header->tag5 = "sine 1 MHz, 8 periods, -3 dBFS  "; // all 32 bytes: zero fill reads back as blanks
+  header->tag6 = 1e9;
+  header->hasExtension1 = header->hasExtension2 = true;
+  header->extension2 = 2.5;
+  header->reservedText = "reserved";
+  header->block5Text = "five";
+  header->tag44 = "forty-four";
+  header->hasTextBlocks = true;
+  header->tag45 = "comment";
+  header->tag46 = "author";
+  header->hasBlock14 = true;
+  header->block14Value = -3.25;
+  ASSERT_TRUE(package.begin(1'000'000, true));
+  writeChunks(package, iq, markers, 65'537); // odd: leftovers cross every chunk
+  EXPECT_FALSE(Tools::exist(file + "_mkr"));
+
+  WaveformImporter importer(file);
+  EXPECT_EQ(importer.getHeaderBytes(), header->getHeaderBytes());
+  auto readBack = importer.getWaveformHeader();
+  ASSERT_NE(readBack, nullptr);
+  EXPECT_EQ(readBack->getHeaderBytes(), header->getHeaderBytes()); // every field and flag
+  EXPECT_EQ(importer.getDataLength(), 1'000'000);
+  Bytes untouched(1'000'000, 0xaa);
+  EXPECT_EQ(importer.getData(untouched), -1);
+  EXPECT_EQ(importer.getMarker(untouched), 0); // an open importer keeps no markers
+  EXPECT_EQ(untouched, Bytes(1'000'000, 0xaa));
+
+  streamingImporter2 samples;
+  ASSERT_TRUE(samples.Open(widePath(file).c_str()));
+  EXPECT_EQ(readAll([&](unsigned char *d, int n) { return samples.GetRawIQData(d, n); }, iq.size()), iq);
+  EXPECT_EQ(readAll([&](unsigned char *d, int n) { return samples.GetMarkers(d, n); }, markers.size()), markers);
+}
+
+TEST(WaveformPackageTest, BeforeBeginEveryWriteIsRefusedAndNoFileAppears) {
+  Bytes chunk(64, 1);
+  const std::pair<const char *, std::function<bool(WaveformPackage &)>> rows[] = {
+      {"append", [&](WaveformPackage &p) { return p.append(chunk); }},
+      {"appendMarker", [&](WaveformPackage &p) { return p.appendMarker(chunk); }},
+      {"beginFloat", [](WaveformPackage &p) { return p.beginFloat(16, true); }},
+      {"appendFloat", [&](WaveformPackage &p) { return p.appendFloat(chunk); }},
+      {"appendFloatMarker", [&](WaveformPackage &p) { return p.appendFloatMarker(chunk); }},
+      {"begin without a name",
+       [&](WaveformPackage &p) {
+         p.setFileName("");
+         return p.begin(16, true) || p.append(chunk);
+       }},
+  };
+  for (const auto &[name, call] : rows) {
+    SCOPED_TRACE(name);
+    TempDir dir;
+    WaveformPackage package;
+    package.setFileName(dir.path("w.wv"));
+    EXPECT_FALSE(call(package));
+    package.end();
+    EXPECT_TRUE(std::filesystem::is_empty(dir.root()));
+  }
+}
+
+TEST(WaveformPackageTest, SecondBeginWritesANewFileAndUnwritableTargetsLeaveNone) {
+  TempDir dir;
+  auto iq = patternBytes(400, 1);
+  auto markers = patternBytes(100, 2);
+  WaveformPackage package;
+  package.setFileName(dir.path("first.wv"));
+  ASSERT_TRUE(package.begin(100, true));
+  EXPECT_TRUE(package.append(gsl::span<unsigned char>(iq.data(), 200))); // abandoned halfway
+  package.setFileName(dir.path("second.wv"));
+  ASSERT_TRUE(package.begin(100, true));
+  EXPECT_TRUE(package.beginFloat(100, true)); // the exporter refuses a second start; the package does not say
+  writeChunks(package, iq, markers, 30);
+  EXPECT_TRUE(Tools::exist(dir.path("first.wv")));
+  EXPECT_EQ(WaveformImporter(dir.path("second.wv")).getDataLength(), 100);
+
+  std::filesystem::create_directory(dir.path("folder"));
+  package.setFileName(dir.path("folder")); // cannot be opened for writing
+  EXPECT_TRUE(package.begin(100, true));
+  writeChunks(package, iq, markers, 30);
+  EXPECT_EQ(std::distance(std::filesystem::directory_iterator(dir.root()), {}), 3); // no "folder_mkr"
+}
