@@ -14,80 +14,63 @@ using namespace Corvane::Wavemill::Testing;
 namespace {
 
 // The flat interface as a program without this library's headers sees it:
-// functions looked up by their export names in the loaded library.
+// functions looked up by their export names in the loaded library. The
+// members carry the names, and the types, of the header's declarations.
 struct Flat {
-  CBlockExporter *(*createExporter)(const char *, unsigned char *, int);
-  void (*disposeExporter)(CBlockExporter *);
-  bool (*start)(CBlockExporter *, int64_t, bool);
-  void (*stop)(CBlockExporter *);
-  bool (*stream)(CBlockExporter *, unsigned char *, unsigned char *, int, bool);
-  bool (*streamiq)(CBlockExporter *, unsigned char *, int);
-  bool (*streammarker)(CBlockExporter *, unsigned char *, int);
-  CBlockImporter *(*createImporter)();
-  void (*disposeImporter)(CBlockImporter *);
-  int (*getKey)(CBlockImporter *);
-  bool (*open)(CBlockImporter *, wchar_t *, unsigned char *);
-  int (*getHeaderLen)(CBlockImporter *);
-  int (*getHeader)(CBlockImporter *, unsigned char *, unsigned int);
-  int64_t (*getDataLen)(CBlockImporter *);
-  int (*getData)(CBlockImporter *, unsigned char *, unsigned int);
-  int (*getMarkers)(CBlockImporter *, unsigned char *, unsigned int);
-  int (*getWavformFormatFlag)(CBlockImporter *);
-  void (*close)(CBlockImporter *);
-
-  Flat() {
+  template <class F> F find(const char *name) {
     std::string error;
-    void *module = Platform::loadModule(WAVEMILL_LIBRARY_FILE, error);
-    EXPECT_NE(module, nullptr) << error;
-    find(module, createExporter, "CreateBlockExporter");
-    find(module, disposeExporter, "DisposeExporter");
-    find(module, start, "start");
-    find(module, stop, "stop");
-    find(module, stream, "stream");
-    find(module, streamiq, "streamiq");
-    find(module, streammarker, "streammarker");
-    find(module, createImporter, "_Z19CreateBlockImporterv");
-    find(module, disposeImporter, "_Z15DisposeImporterP14CBlockImporter");
-    find(module, getKey, "_Z6GetKeyP14CBlockImporter");
-    find(module, open, "_Z4OpenP14CBlockImporterPwPh");
-    find(module, getHeaderLen, "_Z12GetHeaderLenP14CBlockImporter");
-    find(module, getHeader, "_Z9GetHeaderP14CBlockImporterPhj");
-    find(module, getDataLen, "_Z10GetDataLenP14CBlockImporter");
-    find(module, getData, "_Z7GetDataP14CBlockImporterPhj");
-    find(module, getMarkers, "_Z10GetMarkersP14CBlockImporterPhj");
-    find(module, getWavformFormatFlag, "_Z20GetWavformFormatFlagP14CBlockImporter");
-    find(module, close, "_Z5closeP14CBlockImporter");
+    static void *module = Platform::loadModule(WAVEMILL_LIBRARY_FILE, error);
+    auto function = reinterpret_cast<F>(Platform::moduleSymbol(module, name));
+    EXPECT_NE(function, nullptr) << name << error;
+    return function;
   }
-  template <class F> static void find(void *module, F &function, const char *name) {
-    function = reinterpret_cast<F>(Platform::moduleSymbol(module, name));
-    ASSERT_NE(function, nullptr) << name;
-  }
+#define WAVEMILL_FLAT(function, name) decltype(&::function) function = find<decltype(&::function)>(name)
+  WAVEMILL_FLAT(CreateBlockExporter, "CreateBlockExporter");
+  WAVEMILL_FLAT(DisposeExporter, "DisposeExporter");
+  WAVEMILL_FLAT(start, "start");
+  WAVEMILL_FLAT(stop, "stop");
+  WAVEMILL_FLAT(stream, "stream");
+  WAVEMILL_FLAT(streamiq, "streamiq");
+  WAVEMILL_FLAT(streammarker, "streammarker");
+  WAVEMILL_FLAT(CreateBlockImporter, "_Z19CreateBlockImporterv");
+  WAVEMILL_FLAT(DisposeImporter, "_Z15DisposeImporterP14CBlockImporter");
+  WAVEMILL_FLAT(GetKey, "_Z6GetKeyP14CBlockImporter");
+  WAVEMILL_FLAT(Open, "_Z4OpenP14CBlockImporterPwPh");
+  WAVEMILL_FLAT(GetHeaderLen, "_Z12GetHeaderLenP14CBlockImporter");
+  WAVEMILL_FLAT(GetHeader, "_Z9GetHeaderP14CBlockImporterPhj");
+  WAVEMILL_FLAT(GetDataLen, "_Z10GetDataLenP14CBlockImporter");
+  WAVEMILL_FLAT(GetData, "_Z7GetDataP14CBlockImporterPhj");
+  WAVEMILL_FLAT(GetMarkers, "_Z10GetMarkersP14CBlockImporterPhj");
+  WAVEMILL_FLAT(GetWavformFormatFlag, "_Z20GetWavformFormatFlagP14CBlockImporter");
+#undef WAVEMILL_FLAT
+  // ::close may also name the system call.
+  void (*close)(CBlockImporter *) = find<void (*)(CBlockImporter *)>("_Z5closeP14CBlockImporter");
 
   // Reads the file with the call order of a flat caller.
   void read(const std::string &path, Bytes &header, Bytes &iq, Bytes &markers, unsigned int piece) {
-    CBlockImporter *importer = createImporter();
+    CBlockImporter *importer = CreateBlockImporter();
     unsigned char key[16];
-    FormMaskedFileKey(getKey(importer), key);
+    FormMaskedFileKey(GetKey(importer), key);
     std::wstring wide = widePath(path);
-    ASSERT_TRUE(open(importer, wide.data(), key));
-    header.resize(static_cast<std::size_t>(getHeaderLen(importer)));
-    EXPECT_EQ(getHeader(importer, header.data(), static_cast<unsigned int>(header.size())),
+    ASSERT_TRUE(Open(importer, wide.data(), key));
+    header.resize(static_cast<std::size_t>(GetHeaderLen(importer)));
+    EXPECT_EQ(GetHeader(importer, header.data(), static_cast<unsigned int>(header.size())),
               static_cast<int>(header.size()));
-    const auto samples = static_cast<std::size_t>(getDataLen(importer));
-    EXPECT_EQ(getWavformFormatFlag(importer), 0);
+    const auto samples = static_cast<std::size_t>(GetDataLen(importer));
+    EXPECT_EQ(GetWavformFormatFlag(importer), 0);
     Bytes buffer(piece);
     for (iq.clear(); iq.size() < 4 * samples;) {
-      const int got = getData(importer, buffer.data(), piece);
+      const int got = GetData(importer, buffer.data(), piece);
       ASSERT_GT(got, 0);
       iq.insert(iq.end(), buffer.begin(), buffer.begin() + got);
     }
     for (markers.clear(); markers.size() < samples;) {
-      const int got = getMarkers(importer, buffer.data(), piece);
+      const int got = GetMarkers(importer, buffer.data(), piece);
       ASSERT_GT(got, 0);
       markers.insert(markers.end(), buffer.begin(), buffer.begin() + got);
     }
     close(importer);
-    disposeImporter(importer);
+    DisposeImporter(importer);
   }
 };
 
@@ -101,23 +84,23 @@ TEST(FlatInterfaceTest, WaveformsWrittenInChunksReadBackThroughTheExportedNames)
   auto markers = patternBytes(10'000, 33);
 
   // stream(): three chunks, the last one marked.
-  CBlockExporter *exporter = flat.createExporter(dir.path("a.wv").c_str(), header.data(), 100);
+  CBlockExporter *exporter = flat.CreateBlockExporter(dir.path("a.wv").c_str(), header.data(), 100);
   ASSERT_NE(exporter, nullptr);
   EXPECT_TRUE(flat.start(exporter, 10'000, true));
   EXPECT_TRUE(flat.stream(exporter, iq.data(), markers.data(), 3'333, false));
   EXPECT_TRUE(flat.stream(exporter, iq.data() + 4 * 3'333, markers.data() + 3'333, 6'000, false));
   EXPECT_TRUE(flat.stream(exporter, iq.data() + 4 * 9'333, markers.data() + 9'333, 667, true));
-  flat.disposeExporter(exporter);
+  flat.DisposeExporter(exporter);
 
   // streamiq() and streammarker() in pairs, then stop().
-  exporter = flat.createExporter(dir.path("b.wv").c_str(), header.data(), 100);
+  exporter = flat.CreateBlockExporter(dir.path("b.wv").c_str(), header.data(), 100);
   EXPECT_TRUE(flat.start(exporter, 10'000, true));
   for (int at = 0; at < 10'000; at += 2'500) {
     EXPECT_TRUE(flat.streamiq(exporter, iq.data() + 4 * at, 4 * 2'500));
     EXPECT_TRUE(flat.streammarker(exporter, markers.data() + at, 2'500));
   }
   flat.stop(exporter);
-  flat.disposeExporter(exporter);
+  flat.DisposeExporter(exporter);
 
   for (const char *name : {"a.wv", "b.wv"}) {
     SCOPED_TRACE(name);
@@ -134,36 +117,36 @@ TEST(FlatInterfaceTest, NullHandlesAndUnopenedImportersAnswerAsDocumented) {
   Flat flat;
   unsigned char bytes[64] = {};
   wchar_t missing[] = L"/nonexistent/w.wv";
-  EXPECT_EQ(flat.createExporter(nullptr, bytes, 16), nullptr);
-  flat.disposeExporter(nullptr);
+  EXPECT_EQ(flat.CreateBlockExporter(nullptr, bytes, 16), nullptr);
+  flat.DisposeExporter(nullptr);
   flat.stop(nullptr);
   EXPECT_FALSE(flat.start(nullptr, 10, true));
   EXPECT_FALSE(flat.stream(nullptr, bytes, bytes, 1, true));
   EXPECT_FALSE(flat.streamiq(nullptr, bytes, 4));
   EXPECT_FALSE(flat.streammarker(nullptr, bytes, 1));
-  flat.disposeImporter(nullptr);
+  flat.DisposeImporter(nullptr);
   flat.close(nullptr);
-  EXPECT_EQ(flat.getKey(nullptr), 0);
-  EXPECT_FALSE(flat.open(nullptr, missing, bytes));
-  EXPECT_EQ(flat.getHeaderLen(nullptr), -1);
-  EXPECT_EQ(flat.getHeader(nullptr, bytes, 16), -1);
-  EXPECT_EQ(flat.getDataLen(nullptr), -1);
-  EXPECT_EQ(flat.getData(nullptr, bytes, 16), -1);
-  EXPECT_EQ(flat.getMarkers(nullptr, bytes, 16), -1);
-  EXPECT_EQ(flat.getWavformFormatFlag(nullptr), -1);
+  EXPECT_EQ(flat.GetKey(nullptr), 0);
+  EXPECT_FALSE(flat.Open(nullptr, missing, bytes));
+  EXPECT_EQ(flat.GetHeaderLen(nullptr), -1);
+  EXPECT_EQ(flat.GetHeader(nullptr, bytes, 16), -1);
+  EXPECT_EQ(flat.GetDataLen(nullptr), -1);
+  EXPECT_EQ(flat.GetData(nullptr, bytes, 16), -1);
+  EXPECT_EQ(flat.GetMarkers(nullptr, bytes, 16), -1);
+  EXPECT_EQ(flat.GetWavformFormatFlag(nullptr), -1);
 
-  CBlockImporter *importer = flat.createImporter();
-  EXPECT_EQ(flat.getHeaderLen(importer), -1);
-  EXPECT_EQ(flat.getDataLen(importer), 0);
-  EXPECT_EQ(flat.getData(importer, bytes, 16), 0);
-  EXPECT_FALSE(flat.open(importer, missing, bytes));
+  CBlockImporter *importer = flat.CreateBlockImporter();
+  EXPECT_EQ(flat.GetHeaderLen(importer), -1);
+  EXPECT_EQ(flat.GetDataLen(importer), 0);
+  EXPECT_EQ(flat.GetData(importer, bytes, 16), 0);
+  EXPECT_FALSE(flat.Open(importer, missing, bytes));
   // The same handle opens the next file.
   auto header = patternBytes(20, 34);
   writeBytes(dir.path("w.wv"), encryptWaveform(plainWaveform(header, patternBytes(80, 35), nullptr)));
   std::wstring path = widePath(dir.path("w.wv"));
-  FormMaskedFileKey(flat.getKey(importer), bytes);
-  EXPECT_TRUE(flat.open(importer, path.data(), bytes));
-  EXPECT_EQ(flat.getHeaderLen(importer), 20);
-  EXPECT_EQ(flat.getDataLen(importer), 20);
-  flat.disposeImporter(importer);
+  FormMaskedFileKey(flat.GetKey(importer), bytes);
+  EXPECT_TRUE(flat.Open(importer, path.data(), bytes));
+  EXPECT_EQ(flat.GetHeaderLen(importer), 20);
+  EXPECT_EQ(flat.GetDataLen(importer), 20);
+  flat.DisposeImporter(importer);
 }

@@ -52,36 +52,6 @@ struct Reader {
 
 } // namespace
 
-TEST(StreamingImporterTest, PiecesOfAnySizeFromSixteenBytesOnGiveTheWrittenBytes) {
-  TempDir dir;
-  const auto header = patternBytes(300, 1);
-  const auto iq = patternBytes(4 * 300'001, 2);
-  const auto markers = patternBytes(300'001, 3);
-  writeBytes(dir.path("w.wv"), encryptWaveform(plainWaveform(header, iq, &markers)));
-
-  for (const int piece : {16, 28, 4000, (1 << 20) + 4, 4 * 300'001 + 64}) {
-    SCOPED_TRACE(piece);
-    Importer importer;
-    ASSERT_TRUE(importer.openWithFileKey(dir.path("w.wv")));
-    ASSERT_EQ(importer.GetHeaderLength(), 300);
-    Bytes head(300);
-    EXPECT_EQ(importer.GetHeader(head.data(), 300), 300);
-    EXPECT_EQ(head, header);
-    EXPECT_EQ(importer.GetIQDataLen(), 300'001);
-    // Interleaved, with marker pieces of other sizes: the handles and their
-    // surpluses stay apart.
-    Reader iqReader{[&](unsigned char *d, int n) { return importer.GetRawIQData(d, n); }, piece, iq.size()};
-    Reader markerReader{[&](unsigned char *d, int n) { return importer.GetMarkers(d, n); }, piece / 2 + 17,
-                        markers.size()};
-    while (iqReader.step() | markerReader.step()) {
-    }
-    EXPECT_EQ(iqReader.got, iq);
-    EXPECT_EQ(markerReader.got, markers);
-    unsigned char after[16];
-    EXPECT_EQ(importer.GetRawIQData(after, 16), 0);
-  }
-}
-
 TEST(StreamingImporterTest, SmallReadsKeepTheSurplusAndAReadServedFromItAnswersZero) {
   TempDir dir;
   const auto iq = patternBytes(4 * 100, 4);

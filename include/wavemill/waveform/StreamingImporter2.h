@@ -15,11 +15,9 @@
 ///
 ///     streamingImporter2 importer;
 ///     unsigned char key[16];
-///     // key: fixedFileKey, byte i XORed with byte i % 4 of the mask,
-///     // least significant first
-///     unsigned int mask = importer.GetKey();
-///     importer.Open(L"/data/wave.wv", key);
-///     importer.GetRawIQData(buffer, 1 << 20);  // up to 1 MiB of IQ bytes
+///     FormMaskedFileKey(static_cast<int>(importer.GetKey()), key);  // FlatInterface.h
+///     importer.Open(L"/data/wave.wv", key);    // or Open(path), which does both
+///     importer.GetRawIQData(buffer, 1 << 20);  // the first MiB of IQ bytes
 ///
 /// The key is not checked: a wrong one decrypts to noise, and the lengths
 /// read from it mean nothing (reads then stop at the end of the file).
