@@ -317,6 +317,7 @@ void tools() {
 } // namespace
 
 void instruments(); // Instruments.cpp
+void waveforms();   // Waveforms.cpp
 
 int main() {
   std::cout << "Wavemill demo\n";
@@ -326,5 +327,6 @@ int main() {
   saveAndRecall();
   tools();
   instruments();
+  waveforms();
   return 0;
 }
