@@ -81,6 +81,9 @@ std::size_t WideFile::read(void *dest, std::size_t bytes) {
   if (stream == nullptr || dest == nullptr || bytes == 0) {
     return 0;
   }
+  // Not retried: an interrupted read(2) is restarted by the C library for
+  // handlers installed with SA_RESTART, and a short count means the end to
+  // every caller, as it does for the stream this class stands in for.
   return std::fread(dest, 1, bytes, file(stream));
 }
 
