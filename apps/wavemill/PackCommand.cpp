@@ -147,6 +147,11 @@ public:
     exporter->stop();
     checkExporter();
     exporter.reset();
+    // Renaming over an existing file makes ext4 write the new one to disk
+    // before rename returns (its guard for replace-by-rename), which takes
+    // longer than the whole pack; without an old file there is nothing to
+    // guard.
+    std::remove(options.output.c_str());
     renameFile(partial, options.output);
     removePartial.release();
   }
@@ -204,14 +209,28 @@ private:
     Progress progress("packing", input.size(), Progress::wanted(options.quiet));
     std::int64_t done = 0;
     while (const std::size_t got = input.read(iq.data(), iq.size())) {
+      swapBytePairs(iq.data(), got);
       const std::size_t count = got / 4;
-      for (std::size_t n = 0; n < got; n += 2)
-        std::swap(iq[n], iq[n + 1]);
       readMarkers(bits.data(), count);
       stream(iq.data(), bits.data(), count);
       done += static_cast<std::int64_t>(got);
       progress.update(done);
     }
+  }
+
+  // Eight bytes at a time: the loop over single bytes costs a third of the
+  // time the exporter takes for the same data.
+  static void swapBytePairs(unsigned char *data, std::size_t size) {
+    constexpr std::uint64_t low = 0x00FF00FF00FF00FFu;
+    std::size_t n = 0;
+    for (; n + 8 <= size; n += 8) {
+      std::uint64_t word;
+      std::memcpy(&word, data + n, 8);
+      word = (word & low) << 8 | (word >> 8 & low);
+      std::memcpy(data + n, &word, 8);
+    }
+    for (; n + 1 < size; n += 2)
+      std::swap(data[n], data[n + 1]);
   }
 
   void writeConverted() {

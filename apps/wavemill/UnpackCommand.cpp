@@ -3,6 +3,7 @@
 #include "Progress.h"
 #include "ToolError.h"
 #include "WaveformReader.h"
+#include "platform/Terminal.h"
 
 #include <charconv>
 #include <cmath>
@@ -71,6 +72,9 @@ void putInteger(std::vector<char> &out, unsigned value) {
 int runUnpack(const UnpackOptions &options) {
   if (options.input == "-")
     throw UsageError("wv unpack reads a file: FILE cannot be standard input");
+  if (options.output == "-" && options.format != SampleFormat::Csv &&
+      Platform::isTerminal(Platform::StandardStream::Output))
+    throw UsageError("raw samples would garble the terminal: name a file or redirect standard output");
   WaveformReader wave(options.input);
   if (!options.markers.empty() && !wave.hasMarkers())
     throw ToolError(options.input + " holds no markers");
