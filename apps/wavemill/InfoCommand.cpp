@@ -1,9 +1,11 @@
 #include "Commands.h"
 #include "HeaderFields.h"
 #include "Text.h"
+#include "ToolError.h"
 #include "WaveformReader.h"
 
 #include "wavemill/waveform/exportimport/WaveformHeader.h"
+#include "wavemill/waveform/exportimport/WaveformImporter.h"
 
 #include <algorithm>
 #include <iostream>
@@ -15,15 +17,21 @@
 namespace Corvane::Wavemill::Cli {
 
 int runInfo(const InfoOptions &options) {
+  // The reader checks the file and tells the sample format and whether
+  // markers follow; the header record and the count are the importer's.
   WaveformReader wave(options.file);
-  ExportImport::WaveformHeader header;
-  auto bytes = wave.headerBytes();
-  header.setHeaderBytes(bytes);
+  ExportImport::WaveformImporter importer(options.file);
+  const auto record = importer.getWaveformHeader();
+  if (record == nullptr)
+    throw ToolError(options.file + " is not a waveform file");
+  const ExportImport::WaveformHeader &header = *record;
+  const auto bytes = importer.getHeaderBytes();
+  const std::int64_t samples = importer.getDataLength();
 
   // name, value as text, value as JSON
   std::vector<std::pair<std::string, std::pair<std::string, std::string>>> summary = {
       {"file", {options.file, jsonString(options.file)}},
-      {"samples", {formatNumber(wave.samples()), formatNumber(wave.samples())}},
+      {"samples", {formatNumber(samples), formatNumber(samples)}},
       {"format", {wave.floatIq() ? "float" : "integer", wave.floatIq() ? "\"float\"" : "\"integer\""}},
       {"markers", {wave.hasMarkers() ? "present" : "absent", wave.hasMarkers() ? "true" : "false"}},
       {"headerLength", {formatNumber(static_cast<int>(bytes.size())), formatNumber(static_cast<int>(bytes.size()))}},
