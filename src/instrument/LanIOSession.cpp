@@ -89,8 +89,9 @@ struct LanIOSession::Impl {
 
   // One send of the whole piece; false, with the connection closed, when it
   // fails.
-  bool send(const void *data, std::size_t size) {
-    if (Platform::sendAll(socket, data, size) >= 0)
+  // `more`: further parts of the same block follow at once.
+  bool send(const void *data, std::size_t size, bool more = false) {
+    if (Platform::sendAll(socket, data, size, more) >= 0)
       return true;
     close();
     return false;
@@ -287,11 +288,11 @@ void LanIOSession::writeManyBlocksStart(const std::string &command, gsl::span<un
   if (!impl->connected)
     throw InstrumentException("Connection error.");
   const std::string header = blockHeader(command, totalLength);
-  if (impl->send(header.data(), header.size()))
-    impl->send(firstPart.data(), firstPart.size());
+  if (impl->send(header.data(), header.size(), true))
+    impl->send(firstPart.data(), firstPart.size(), true);
 }
 
-void LanIOSession::writeManyBlocks(gsl::span<unsigned char> part) { impl->send(part.data(), part.size()); }
+void LanIOSession::writeManyBlocks(gsl::span<unsigned char> part) { impl->send(part.data(), part.size(), true); }
 
 std::vector<unsigned char> LanIOSession::readBlock(const std::string &command) { return impl->readBlock(command); }
 

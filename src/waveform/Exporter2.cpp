@@ -2,6 +2,8 @@
 
 #include "wavemill/waveform/EncryptKey.h"
 
+#include "waveform/RemoveWrittenFile.h"
+
 #include <algorithm>
 #include <climits>
 #include <cmath>
@@ -356,5 +358,5 @@ void Exporter2::appendEncryptedData(const std::string &path) {
 
 void Exporter2::discardOutput() {
   writeFailed = true;
-  std::remove(fileName.c_str());
+  Corvane::Wavemill::removeWrittenFile(fileName);
 }

@@ -1,5 +1,7 @@
 #include "wavemill/waveform/StreamingExporter2.h"
 
+#include "waveform/RemoveWrittenFile.h"
+
 #include <charconv>
 #include <climits>
 #include <cstdio>
@@ -285,7 +287,7 @@ void StreamingExporterBase::discardOutput() {
   Exporter2::discardOutput();
   for (const std::string *name : {&markerTempName, &rawTempName}) {
     if (!name->empty()) {
-      std::remove(name->c_str());
+      Corvane::Wavemill::removeWrittenFile(*name);
     }
   }
 }
@@ -310,7 +312,7 @@ void StreamingExporterBase::appendMarkerFile() {
     }
   }
   std::fclose(markers);
-  std::remove(markerTempName.c_str());
+  Corvane::Wavemill::removeWrittenFile(markerTempName);
   if (!ok) {
     discardOutput();
   }
@@ -361,5 +363,5 @@ void StreamingExporterBase::streamRawKnownWave() {
     }
     std::fclose(raw);
   }
-  std::remove(rawTempName.c_str());
+  Corvane::Wavemill::removeWrittenFile(rawTempName);
 }
