@@ -12,7 +12,6 @@
 
 #include <algorithm>
 #include <charconv>
-#include <cstring>
 #include <stdexcept>
 #include <utility>
 
@@ -278,18 +277,14 @@ void Instrument::sendBlock(const std::string &command, gsl::span<unsigned char> 
       s.writeBlock(header, data);
       return;
     }
-    std::vector<unsigned char> buffer(blockPart);
-    std::memcpy(buffer.data(), data.data(), blockPart);
-    s.writeManyBlocksStart(header, buffer, gsl::narrow<int>(data.size()));
+    // The parts are handed on as views of the caller's data: copying each
+    // into a buffer first would cost a second pass over the whole block.
+    s.writeManyBlocksStart(header, data.subspan(0, blockPart), gsl::narrow<int>(data.size()));
     std::size_t offset = blockPart;
-    for (; data.size() - offset >= blockPart; offset += blockPart) {
-      std::memcpy(buffer.data(), data.data() + offset, blockPart);
-      s.writeManyBlocks(buffer);
-    }
-    if (const std::size_t rest = data.size() - offset; rest > 0) {
-      std::memcpy(buffer.data(), data.data() + offset, rest);
-      s.writeManyBlocks(gsl::span<unsigned char>(buffer.data(), rest));
-    }
+    for (; data.size() - offset >= blockPart; offset += blockPart)
+      s.writeManyBlocks(data.subspan(offset, blockPart));
+    if (offset < data.size())
+      s.writeManyBlocks(data.subspan(offset));
     s.writeManyBlocksEnd();
   });
 }

@@ -89,9 +89,8 @@ struct LanIOSession::Impl {
 
   // One send of the whole piece; false, with the connection closed, when it
   // fails.
-  // `more`: further parts of the same block follow at once.
-  bool send(const void *data, std::size_t size, bool more = false) {
-    if (Platform::sendAll(socket, data, size, more) >= 0)
+  bool send(const void *data, std::size_t size) {
+    if (Platform::sendAll(socket, data, size) >= 0)
       return true;
     close();
     return false;
@@ -288,11 +287,11 @@ void LanIOSession::writeManyBlocksStart(const std::string &command, gsl::span<un
   if (!impl->connected)
     throw InstrumentException("Connection error.");
   const std::string header = blockHeader(command, totalLength);
-  if (impl->send(header.data(), header.size(), true))
-    impl->send(firstPart.data(), firstPart.size(), true);
+  if (impl->send(header.data(), header.size()))
+    impl->send(firstPart.data(), firstPart.size());
 }
 
-void LanIOSession::writeManyBlocks(gsl::span<unsigned char> part) { impl->send(part.data(), part.size(), true); }
+void LanIOSession::writeManyBlocks(gsl::span<unsigned char> part) { impl->send(part.data(), part.size()); }
 
 std::vector<unsigned char> LanIOSession::readBlock(const std::string &command) { return impl->readBlock(command); }
 

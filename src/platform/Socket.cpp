@@ -186,10 +186,10 @@ void resolveAddresses(const std::string &host, std::string &firstIPv4, std::stri
 
 // ---- Transfer ------------------------------------------------------------------
 
-long sendBytes(SocketHandle socket, const void *data, std::size_t size, bool more) {
+long sendBytes(SocketHandle socket, const void *data, std::size_t size) {
   for (;;) {
     // MSG_NOSIGNAL: a peer that has gone makes send fail, not kill the process.
-    const ssize_t sent = ::send(socket, data, size, MSG_NOSIGNAL | (more ? MSG_MORE : 0));
+    const ssize_t sent = ::send(socket, data, size, MSG_NOSIGNAL);
     if (sent >= 0)
       return static_cast<long>(sent);
     // Interrupted before anything was sent (otherwise the count comes back):
@@ -199,13 +199,13 @@ long sendBytes(SocketHandle socket, const void *data, std::size_t size, bool mor
   }
 }
 
-long sendAll(SocketHandle socket, const void *data, std::size_t size, bool more) {
+long sendAll(SocketHandle socket, const void *data, std::size_t size) {
   const auto *bytes = static_cast<const unsigned char *>(data);
   std::size_t done = 0;
   while (done < size) {
     // A short send (a time-out or a signal after some bytes went) is followed
     // by another; a time-out with nothing sent comes back as -1.
-    const long sent = sendBytes(socket, bytes + done, size - done, more);
+    const long sent = sendBytes(socket, bytes + done, size - done);
     if (sent <= 0)
       return -1;
     done += static_cast<std::size_t>(sent);

@@ -42,12 +42,9 @@ void resolveAddresses(const std::string &host, std::string &firstIPv4, std::stri
 // ---- Transfer ------------------------------------------------------------------
 
 // One send of up to `size` bytes: the count sent, or -1.
-long sendBytes(SocketHandle socket, const void *data, std::size_t size, bool more = false);
+long sendBytes(SocketHandle socket, const void *data, std::size_t size);
 // Sends all `size` bytes, looping over short sends: `size`, or -1.
-// With `more`, the bytes may wait for the next send to fill a segment (a
-// block sent in many parts then goes out in full segments, not in one
-// segment a part); a send without it pushes everything out.
-long sendAll(SocketHandle socket, const void *data, std::size_t size, bool more = false);
+long sendAll(SocketHandle socket, const void *data, std::size_t size);
 // One receive of up to `size` bytes: the count, 0 at the end of the stream,
 // -1 on error or time-out.
 long receiveBytes(SocketHandle socket, void *data, std::size_t size);

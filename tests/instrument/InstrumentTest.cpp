@@ -136,7 +136,9 @@ TEST(InstrumentTest, SendIfDifferentComparesNumbersByValueAndTextsByShortForm) {
       outcome = error;
     EXPECT_EQ(outcome, row.outcome);
     if (outcome == "sent" || outcome == "kept") {
-      const Strings wire = outcome == "sent" ? Strings{query, command} : Strings{query};
+      // A command gets no answer: *OPC? makes sure the simulator has read it.
+      instrument.query("*OPC?", -1);
+      const Strings wire = outcome == "sent" ? Strings{query, command, "*OPC?"} : Strings{query, "*OPC?"};
       EXPECT_EQ(simulator.getCommands(), wire);
       EXPECT_FALSE(instrument.sendIfDifferent(command)); // the second push finds the value in place
     }
