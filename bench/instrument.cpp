@@ -5,15 +5,19 @@
 // - a 64 MiB block sent with Instrument::sendBlock and raw, each followed by
 //   "*OPC?" so that the time covers the server taking in every byte;
 // - a 64 MiB block read with Instrument::queryBlock and raw.
+// - the same "*IDN?" round trips and a 64 MiB Instrument::sendBlock through a
+//   VISA address (Wavemill's own libcorvisa.so over the same loopback).
 // The ratios of these pairs are what the README reports.
 
 #include "wavemill/instrument/Instrument.h"
 #include "wavemill/simulator/SimulatedInstrument.h"
 
+#include "platform/Environment.h"
 #include "platform/Socket.h"
 
 #include <benchmark/benchmark.h>
 
+#include <algorithm>
 #include <cstring>
 #include <stdexcept>
 #include <string>
@@ -166,6 +170,38 @@ void BM_ReadBlockRaw(benchmark::State &state) {
   state.SetBytesProcessed(static_cast<std::int64_t>(state.iterations() * blockSize));
 }
 BENCHMARK(BM_ReadBlockRaw)->Unit(benchmark::kMillisecond)->UseRealTime();
+
+// The simulated instrument as a VISA resource: libcorvisa.so carries
+// TCPIP0::127.0.0.1::inst0::INSTR to the port in CORVISA_INSTR_PORT.
+std::string visaAddress() {
+  Platform::setEnvironmentVariable("CORVISA_INSTR_PORT", std::to_string(simulator().getPort()));
+  return "TCPIP0::127.0.0.1::inst0::INSTR";
+}
+
+void BM_IdnQueryVisa(benchmark::State &state) {
+  Instrument instrument(visaAddress());
+  instrument.query("*IDN?", 5000);
+  for (auto _ : state)
+    benchmark::DoNotOptimize(instrument.query("*IDN?", 5000));
+}
+BENCHMARK(BM_IdnQueryVisa);
+
+void BM_SendBlockVisa(benchmark::State &state) {
+  Instrument instrument(visaAddress());
+  // A VISA block header carries the digit count but not the length, so the
+  // data open with their own length digits for the simulator to read; the
+  // zero byte that ends a VISA block is taken in by a throw-away *CLS.
+  std::vector<unsigned char> data = blockData();
+  const std::string length = std::to_string(blockSize - 8);
+  std::copy(length.begin(), length.end(), data.begin());
+  for (auto _ : state) {
+    instrument.sendBlock("MMEM:DATA 'sent',", data, 4096);
+    instrument.send("*CLS");
+    benchmark::DoNotOptimize(instrument.query("*OPC?", 20000));
+  }
+  state.SetBytesProcessed(static_cast<std::int64_t>(state.iterations() * blockSize));
+}
+BENCHMARK(BM_SendBlockVisa)->Unit(benchmark::kMillisecond)->UseRealTime();
 
 } // namespace
 
