@@ -290,7 +290,7 @@ TEST(WavemillToolTest, ScpiIdentifyAndBlocksAgainstTheSimulatedInstrument) {
   TempDir dir;
   std::string block;
   for (int n = 0; n < 300000; ++n)
-    block += static_cast<char>(n * 7919 >> 3);
+    block += static_cast<char>((static_cast<unsigned>(n) * 7919U) >> 3);
   writeAll(dir.path("up.bin"), block);
   for (const auto &row : rows) {
     SCOPED_TRACE(row.commandLine);
