@@ -5,7 +5,7 @@
 
 namespace {
 
-const FileHeader::BlockLocationSpec ArbLayout[] = {
+const FileHeader::FieldPlace ArbLayout[] = {
     {FileHeader::Tag5, 32}, {FileHeader::Tag6, 8},  {FileHeader::Tag7, 1},  {FileHeader::Tag8, 1},
     {FileHeader::Tag9, 1},  {FileHeader::Tag10, 1}, {FileHeader::Tag11, 1}, {FileHeader::Tag12, 1},
     {FileHeader::Tag13, 1}, {FileHeader::Tag14, 1}, {FileHeader::Tag15, 8}, {FileHeader::Tag16, 8},
@@ -48,9 +48,9 @@ unsigned int ArbFileHeader::getHeaderId() const { return 0; }
 
 void ArbFileHeader::doInit() {
   int offset = FirstOffset;
-  for (const BlockLocationSpec &spec : ArbLayout) {
-    registerLocation(spec.tag, Location{offset, spec.length, BlockBase});
-    offset += spec.length;
+  for (const FieldPlace &place : ArbLayout) {
+    registerLocation(place.tag, Location{offset, place.length, BlockBase});
+    offset += place.length;
   }
 }
 

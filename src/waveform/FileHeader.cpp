@@ -118,16 +118,16 @@ void FileHeader::registerLocation(Tag tag, Location location) {
   }
 }
 
-void FileHeader::registerBlock(HeaderBlockId block, const BlockLocationSpec *specs, int count) {
-  if (specs == nullptr || block < 0 || block >= StandardBlockCount) {
+void FileHeader::registerBlock(HeaderBlockId block, const FieldPlace *places, int count) {
+  if (places == nullptr || block < 0 || block >= StandardBlockCount) {
     return;
   }
   int offset = blockSizes[block];
   for (int i = 0; i < count; ++i) {
-    registerLocation(specs[i].tag, Location{offset, specs[i].length, block});
+    registerLocation(places[i].tag, Location{offset, places[i].length, block});
     // Capped past the largest block so that absurd lengths cannot overflow;
     // every later tag is then refused anyway.
-    offset = std::min(offset + std::clamp(specs[i].length, 0, MaxBlockBytes + 1), MaxBlockBytes + 1);
+    offset = std::min(offset + std::clamp(places[i].length, 0, MaxBlockBytes + 1), MaxBlockBytes + 1);
   }
 }
 

@@ -6,10 +6,10 @@
 
 namespace {
 
-using Spec = FileHeader::BlockLocationSpec;
+using Place = FileHeader::FieldPlace;
 
 // Length 0 registers a variable field, running to the end of its block.
-const Spec Block1Layout[] = {
+const Place Block1Layout[] = {
     {FileHeader::Tag5, 32}, {FileHeader::Tag6, 8},  {FileHeader::Tag7, 1},  {FileHeader::Tag8, 1},
     {FileHeader::Tag9, 1},  {FileHeader::Tag10, 1}, {FileHeader::Tag11, 1}, {FileHeader::Tag12, 1},
     {FileHeader::Tag13, 1}, {FileHeader::Tag15, 8}, {FileHeader::Tag16, 8}, {FileHeader::Tag17, 4},
@@ -17,15 +17,15 @@ const Spec Block1Layout[] = {
     {FileHeader::Tag28, 8}, {FileHeader::Tag29, 8}, {FileHeader::Tag30, 8}, {FileHeader::Tag31, 2},
     {FileHeader::Tag32, 1}, {FileHeader::Tag33, 8}, {FileHeader::Tag34, 1},
 };
-const Spec Block2Layout[] = {{FileHeader::Tag39, 0}};
-const Spec Block3Layout[] = {
+const Place Block2Layout[] = {{FileHeader::Tag39, 0}};
+const Place Block3Layout[] = {
     {FileHeader::Tag20, 4}, {FileHeader::Tag35, 1}, {FileHeader::Tag36, 8},
     {FileHeader::Tag37, 8}, {FileHeader::Tag38, 4},
 };
-const Spec Block10Layout[] = {
+const Place Block10Layout[] = {
     {FileHeader::Tag41, 1}, {FileHeader::Tag42, 4}, {FileHeader::Tag43, 1}, {FileHeader::Tag44, 0}};
-const Spec Block11Layout[] = {{FileHeader::Tag45, 0}};
-const Spec Block12Layout[] = {{FileHeader::Tag46, 0}};
+const Place Block11Layout[] = {{FileHeader::Tag45, 0}};
+const Place Block12Layout[] = {{FileHeader::Tag46, 0}};
 
 } // namespace
 

@@ -134,7 +134,7 @@ public:
   };
 
   /// One row of a block's layout table: a tag and its length.
-  struct BlockLocationSpec {
+  struct FieldPlace {
     Tag tag;
     int length;
   };
@@ -205,9 +205,9 @@ protected:
   /// A header of the base registrations carrying `other`'s data as `convert`
   /// moves it; without block memory unless that data brought some.
   FileHeader(const FileHeader &other, bool flexible);
-  /// Registers the tags of `specs` one after another from the block's
+  /// Registers the tags of `places` one after another from the block's
   /// present registered size on. A tag that is not taken still uses its room.
-  void registerBlock(HeaderBlockId block, const BlockLocationSpec *specs, int count);
+  void registerBlock(HeaderBlockId block, const FieldPlace *places, int count);
   /// Registers one tag; the first registration wins. Ignored for a tag
   /// outside 0 to 48, a block outside 0 to 14, or a field that would end
   /// past byte 255. A block that grows loses its memory until `clear()`.
