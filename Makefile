@@ -60,7 +60,7 @@ format-check: bootstrap
 # project against that tree with CMake and with pkg-config and runs both.
 consumer: bootstrap
 	cmake --preset release
-	cmake --build --preset release -j 2 --target wavemill wavemill_simulator wavemill-sim
+	cmake --build --preset release -j 2 --target wavemill wavemill_simulator wavemill-sim corvisa wavemill_tool
 	rm -rf $(INSTALL_DIR) $(CONSUMER_DIR)
 	cmake --install build/release --prefix $(INSTALL_DIR)
 	cmake -S tests/consumer -B $(CONSUMER_DIR) -G Ninja -DCMAKE_BUILD_TYPE=Release -DCMAKE_PREFIX_PATH=$(INSTALL_DIR)
