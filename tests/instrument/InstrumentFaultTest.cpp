@@ -36,7 +36,12 @@ std::string run(SimulatedInstrument &simulator, const std::string &operation) {
       return answer.empty() ? "empty" : answer == block ? "value" : "damaged";
     }
     instrument.sendBlock("MMEM:DATA 'v'", block, 4096);
-    instrument.query("*OPC?", -1); // the block has arrived once a later line is read
+    try {
+      instrument.query("*OPC?", -1); // the block has arrived once a later line is read
+    } catch (const std::runtime_error &) {
+      // A refused connection may fail here or read empty, as the close
+      // races the sends; whether the block arrived is what is asked.
+    }
     return simulator.getBlock("v") == block ? "value" : "empty";
   } catch (const std::runtime_error &e) {
     return e.what();
