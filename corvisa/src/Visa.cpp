@@ -116,6 +116,27 @@ template <typename Body> ViStatus guarded(Body body) noexcept {
   }
 }
 
+// What viRead and viWrite share: the record, the count reset, the checks of
+// handle and buffer, and the count handed back also on failure.
+template <class Buffer, class Transfer>
+ViStatus transfer(const char *name, ViSession vi, Buffer buf, ViUInt32 cnt, ViPUInt32 retCnt, Transfer move) {
+  return guarded([&] {
+    record(name, std::to_string(cnt));
+    if (retCnt != nullptr)
+      *retCnt = 0;
+    const auto session = Handles::instance().session(vi);
+    if (!session)
+      return VI_ERROR_INV_OBJECT;
+    if (buf == nullptr && cnt > 0)
+      return VI_ERROR_INV_PARAMETER;
+    ViUInt32 moved = 0;
+    const ViStatus status = move(*session, buf, cnt, moved);
+    if (retCnt != nullptr)
+      *retCnt = moved;
+    return status;
+  });
+}
+
 } // namespace
 
 extern "C" {
@@ -240,38 +261,14 @@ ViStatus viGetAttribute(ViObject vi, ViAttr attrName, void *attrValue) {
 }
 
 ViStatus viRead(ViSession vi, ViPBuf buf, ViUInt32 cnt, ViPUInt32 retCnt) {
-  return guarded([&] {
-    record("viRead", std::to_string(cnt));
-    if (retCnt != nullptr)
-      *retCnt = 0;
-    const auto session = Handles::instance().session(vi);
-    if (!session)
-      return VI_ERROR_INV_OBJECT;
-    if (buf == nullptr && cnt > 0)
-      return VI_ERROR_INV_PARAMETER;
-    ViUInt32 received = 0;
-    const ViStatus status = session->read(buf, cnt, received);
-    if (retCnt != nullptr)
-      *retCnt = received;
-    return status;
+  return transfer("viRead", vi, buf, cnt, retCnt, [](auto &session, ViPBuf data, ViUInt32 count, ViUInt32 &moved) {
+    return session.read(data, count, moved);
   });
 }
 
 ViStatus viWrite(ViSession vi, ViConstBuf buf, ViUInt32 cnt, ViPUInt32 retCnt) {
-  return guarded([&] {
-    record("viWrite", std::to_string(cnt));
-    if (retCnt != nullptr)
-      *retCnt = 0;
-    const auto session = Handles::instance().session(vi);
-    if (!session)
-      return VI_ERROR_INV_OBJECT;
-    if (buf == nullptr && cnt > 0)
-      return VI_ERROR_INV_PARAMETER;
-    ViUInt32 sent = 0;
-    const ViStatus status = session->write(buf, cnt, sent);
-    if (retCnt != nullptr)
-      *retCnt = sent;
-    return status;
+  return transfer("viWrite", vi, buf, cnt, retCnt, [](auto &session, ViConstBuf data, ViUInt32 count, ViUInt32 &moved) {
+    return session.write(data, count, moved);
   });
 }
 

@@ -23,7 +23,7 @@ namespace {
 // whatever threshold the caller chose.
 constexpr std::size_t blockPart = 4096;
 
-// printf's "%f" in the "C" locale: fixed notation, six places. The largest
+// printf's %f in the "C" locale: fixed notation, six places. The largest
 // double has 309 digits before the point.
 std::string formatFixed(double value) {
   char text[400];

@@ -14,7 +14,7 @@ namespace Corvane::Wavemill::NumberText {
 
 // The one way the library reads and writes numbers as text: always the form
 // of the "C" locale (a decimal point, no grouping), whatever the application
-// has set with setlocale. strtod, std::stod and printf's "%g" follow
+// has set with setlocale. strtod, std::stod and printf's %g follow
 // LC_NUMERIC, so under a German locale they read "2.5" as 2 and write 0.5 as
 // "0,5", which no document of ours may contain.
 //
@@ -189,7 +189,7 @@ inline Read<std::int32_t> readInt32(std::string_view text, int base) { return re
 
 inline Read<std::int64_t> readInt64(std::string_view text, int base) { return readInteger<std::int64_t>(text, base); }
 
-/// The text of printf's "%.15g" in the "C" locale: 1e6 -> "1000000",
+/// The text of printf's %.15g in the "C" locale: 1e6 -> "1000000",
 /// 0.1 -> "0.1", 1e20 -> "1e+20". Written without the format parser: a
 /// document of thousands of numbers spends much of its time here.
 inline std::string formatDouble(double value) {

@@ -375,17 +375,25 @@ void Rijndael::cfb1(const unsigned char *in, unsigned char *out, int blocks, boo
   }
 }
 
-int Rijndael::blockEncrypt(const unsigned char *input, int inputBits, unsigned char *out) {
+int Rijndael::blocksToProcess(const unsigned char *input, int inputBits, const unsigned char *out,
+                              Direction wanted) const {
   if (state != Valid) {
     return NotInitialized;
   }
-  if (direction != Encrypt) {
+  if (direction != wanted) {
     return BadDirection;
   }
   if (input == nullptr || out == nullptr || inputBits <= 0) {
     return 0;
   }
-  const int blocks = inputBits / 128;
+  return inputBits / 128;
+}
+
+int Rijndael::blockEncrypt(const unsigned char *input, int inputBits, unsigned char *out) {
+  const int blocks = blocksToProcess(input, inputBits, out, Encrypt);
+  if (blocks <= 0) {
+    return blocks;
+  }
   switch (mode) {
   case ECB:
     ecbEncrypt(input, out, blocks);
@@ -401,16 +409,10 @@ int Rijndael::blockEncrypt(const unsigned char *input, int inputBits, unsigned c
 }
 
 int Rijndael::blockDecrypt(const unsigned char *input, int inputBits, unsigned char *out) {
-  if (state != Valid) {
-    return NotInitialized;
+  const int blocks = blocksToProcess(input, inputBits, out, Decrypt);
+  if (blocks <= 0) {
+    return blocks;
   }
-  if (direction != Decrypt) {
-    return BadDirection;
-  }
-  if (input == nullptr || out == nullptr || inputBits <= 0) {
-    return 0;
-  }
-  const int blocks = inputBits / 128;
   switch (mode) {
   case ECB:
     ecbDecrypt(input, out, blocks);

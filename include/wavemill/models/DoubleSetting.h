@@ -18,7 +18,7 @@ public:
   explicit DoubleSetting(const char *name);
   DoubleSetting(const char *name, double value, double minimum, double maximum, double step);
 
-  /// printf "%.15g" in the "C" locale, whatever locale the process has set:
+  /// printf %.15g in the "C" locale, whatever locale the process has set:
   /// 1e6 -> "1000000", 0.1 -> "0.1", never "0,1".
   std::string toString() const override;
   /// Reads a number from the start of `text` as strtod does in the "C"

@@ -87,7 +87,7 @@ struct SimulatorOptions {
 /// - "HEADER value" stores `value` under the upper-cased header; "HEADER?"
 ///   answers it: "FREQ 1e9" then "freq?" -> "1e9".
 /// - "HEADER? MIN" and "HEADER? MAX" answer the range of the header in the
-///   form of printf's "%.15g" in the "C" locale: "POW? MIN" -> "-130",
+///   form of printf's %.15g in the "C" locale: "POW? MIN" -> "-130",
 ///   "FREQ? MAX" -> "6000000000", 1e20 -> "1e+20".
 /// - "MMEM:DATA 'name',#<d><len><bytes>" stores a definite-length block of
 ///   any size under `name`; "MMEM:DATA? 'name'" answers

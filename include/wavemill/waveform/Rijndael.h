@@ -136,6 +136,9 @@ protected:
   void keyEncToDec();
 
 private:
+  // The blocks of one call in `wanted` direction, or 0 or a negative code
+  // when nothing is to be done.
+  int blocksToProcess(const unsigned char *input, int inputBits, const unsigned char *out, Direction wanted) const;
   void ecbEncrypt(const unsigned char *in, unsigned char *out, int blocks) const;
   void ecbDecrypt(const unsigned char *in, unsigned char *out, int blocks) const;
   void cbcEncrypt(const unsigned char *in, unsigned char *out, int blocks) const;
