@@ -1,8 +1,4 @@
-#include "wavemill/models/ModelBase.h"
-#include "wavemill/models/BoolSetting.h"
-#include "wavemill/models/Couplings.h"
-#include "wavemill/models/DoubleSetting.h"
-#include "wavemill/models/Int32Setting.h"
+#include "support/TestModels.h"
 #include "wavemill/services/LogBase.h"
 
 #include <gtest/gtest.h>
@@ -25,45 +21,36 @@ public:
   std::function<void()> hook;
 };
 
-class Oscillux : public ModelBase {
-public:
-  Oscillux() : ModelBase("Quartz::Oscillux") {}
-  std::shared_ptr<IModel> create() const override { return std::make_shared<Oscillux>(); }
-  std::shared_ptr<IModel> getPrototype() const override { return Prototype::getInstance<Oscillux>(); }
+// A Source with a second setting named "Count", a hooked setting and a
+// count of its initialisations.
+struct Probe : Testing::Source {
+  WAVEMILL_MODEL(Probe)
   void initialize() override { ++initializations; }
   void change() {
     level->setValue(7.25);
     label->setValue("busy");
   }
-
-  std::shared_ptr<DoubleSetting> level = init(std::make_shared<DoubleSetting>("Level", 1.5, -10.0, 10.0, 0.0));
-  std::shared_ptr<Int32Setting> taps = init(std::make_shared<Int32Setting>("Taps"));
-  std::shared_ptr<StringSetting> label = init(std::make_shared<StringSetting>("Label", "idle"));
-  std::shared_ptr<Int32Setting> shadow = init(std::make_shared<Int32Setting>("Taps"));
+  std::shared_ptr<Int32Setting> shadow = init(std::make_shared<Int32Setting>("Count"));
   std::shared_ptr<HookSetting> probe = init(std::make_shared<HookSetting>("Probe"));
   int initializations = 0;
 };
 
-// Same settings as Oscillux, but another class.
-class OscilluxTwin : public Oscillux {
-public:
-  std::shared_ptr<IModel> create() const override { return std::make_shared<OscilluxTwin>(); }
-  std::shared_ptr<IModel> getPrototype() const override { return Prototype::getInstance<OscilluxTwin>(); }
+// The same settings as Probe, but another class.
+struct Twin : Probe {
+  WAVEMILL_MODEL(Twin)
 };
 
-// An active root whose couplings count and record what they receive.
-class ModelBaseTest : public testing::Test {
+// A live Probe whose couplings count and record what they receive.
+class ModelBaseTest : public testing::Test, public Testing::LiveTree<Probe> {
 protected:
   ModelBaseTest() {
-    model->activateSettings(&interceptor, nullptr);
-    model->setCouplings(std::make_shared<Couplings>([this](ModelBase *, Transaction *transaction) {
+    root->onCouple([this](ModelBase *, Transaction *transaction) {
       ++couples;
       method = transaction->getMethodName();
       option = transaction->getOption();
-    }));
+    });
   }
-  std::shared_ptr<Oscillux> model = std::make_shared<Oscillux>();
-  Interceptor interceptor{model};
+  std::shared_ptr<Probe> &model = root;
   int couples = 0;
   std::string method;
   TransactionOption option = TransactionOption::NoCouple;
@@ -71,7 +58,7 @@ protected:
 
 } // namespace
 
-TEST_F(ModelBaseTest, ContextComesFirstAndTypeNameDropsNamespace) {
+TEST_F(ModelBaseTest, ContextComesFirstTypeNameDropsNamespaceAndFirstOfEqualSettingNamesWins) {
   ModelBase plain("Foo::Bar");
   ASSERT_EQ(plain.getAllSettings().size(), 1u);
   EXPECT_EQ(plain.getAllSettings()[0]->getName(), "Context");
@@ -80,22 +67,21 @@ TEST_F(ModelBaseTest, ContextComesFirstAndTypeNameDropsNamespace) {
   EXPECT_EQ(ModelBase("Flat").getTypeName(), "Flat");
   EXPECT_EQ(model->getAllSettings()[0], model->getContext());
   // One full name serves every class that keeps the inherited form.
-  EXPECT_EQ(plain.getFullTypeName(), model->getFullTypeName());
+  EXPECT_EQ(plain.getFullTypeName(), ModelBase("Other").getFullTypeName());
   EXPECT_EQ(plain.getFullTypeName().rfind("Models.", 0), 0u);
-}
 
-TEST_F(ModelBaseTest, GetSettingUsesOneMapPerClassAndFirstOfEqualNamesWins) {
-  Oscillux other;
+  // The name map is built once per class and serves every instance.
+  Probe other;
   EXPECT_EQ(model->getSetting("Level"), model->level);
   EXPECT_EQ(other.getSetting("Label"), other.label);
-  EXPECT_EQ(model->getSetting("Taps"), model->taps);
+  EXPECT_EQ(model->getSetting("Count"), model->count);
   EXPECT_EQ(model->getSetting("Context"), model->getContext());
   EXPECT_EQ(model->getSetting("Absent"), nullptr);
 }
 
 TEST_F(ModelBaseTest, ActivationBindsInOrderAndDeactivationIsTerminal) {
-  Oscillux parent;
-  auto child = std::make_shared<Oscillux>();
+  Probe parent;
+  auto child = std::make_shared<Probe>();
   bool ownerSetFirst = false;
   child->probe->hook = [&] {
     ownerSetFirst =
@@ -124,35 +110,27 @@ TEST_F(ModelBaseTest, ActivationBindsInOrderAndDeactivationIsTerminal) {
   EXPECT_EQ(parent.getAllSettings(), before);
 }
 
-TEST_F(ModelBaseTest, PathJoinsKeysBelowTheRoot) {
-  ModelBase root("Root"), a("A"), gap("Gap"), b("B"), c("C"), lead("Lead"), d("D");
+TEST(ModelTreeTest, PathJoinsKeysBelowTheRootAndAncestorCountsItselfFirst) {
+  ModelBase root("Root"), a("Outer::A"), gap("Gap"), b("Inner::B"), c("C"), lead("Lead"), d("D");
   root.setThisKey("Ignored");
   EXPECT_EQ(root.getThisKey(), "");
   EXPECT_EQ(root.makePath(), "");
-  auto place = [](ModelBase &child, ModelBase &owner, const std::string &key) {
-    child.setOwner(&owner);
-    child.setThisKey(key);
-  };
-  place(a, root, "A");
-  place(b, a, "B");
-  place(gap, a, "");
-  place(c, gap, "C");
-  place(lead, root, "");
-  place(d, lead, "D");
+  for (auto [child, owner, key] :
+       {std::make_tuple(&a, &root, "A"), std::make_tuple(&b, &a, "B"), std::make_tuple(&gap, &a, ""),
+        std::make_tuple(&c, &gap, "C"), std::make_tuple(&lead, &root, ""), std::make_tuple(&d, &lead, "D")}) {
+    child->setOwner(owner);
+    child->setThisKey(key);
+  }
   EXPECT_EQ(a.makePath(), "A");
   EXPECT_EQ(b.makePath(), "A,B");
   EXPECT_EQ(c.makePath(), "A,,C"); // an empty key in the middle keeps its comma
   EXPECT_EQ(d.makePath(), "D");    // but no comma before any text
+  EXPECT_EQ(b.ancestor("B"), &b);
+  EXPECT_EQ(b.ancestor("A"), &a);
+  EXPECT_EQ(b.ancestor("Missing"), &b);
 }
 
-TEST_F(ModelBaseTest, AncestorCountsItselfFirstAndStopsOnLoopsWithWarning) {
-  ModelBase top("Outer::Console"), mid("Inner::Panel"), leaf("Inner::Knob");
-  mid.setOwner(&top);
-  leaf.setOwner(&mid);
-  EXPECT_EQ(leaf.ancestor("Knob"), &leaf);
-  EXPECT_EQ(leaf.ancestor("Panel"), &mid);
-  EXPECT_EQ(leaf.ancestor("Missing"), &leaf);
-
+TEST(ModelTreeTest, AncestorStopsOnDeepChainsAndLoopsWithAWarning) {
   std::vector<std::pair<int, std::string>> warnings;
   auto subscription = LogBase::get("Log")->getSubject().get_observable().subscribe(
       [&](LogMessage *message) { warnings.emplace_back(message->level, message->text); });
@@ -165,8 +143,10 @@ TEST_F(ModelBaseTest, AncestorCountsItselfFirstAndStopsOnLoopsWithWarning) {
   EXPECT_EQ(chain[0]->ancestor("Fifty"), chain[50].get());
   EXPECT_TRUE(warnings.empty());
   EXPECT_EQ(chain[0]->ancestor("FiftyOne"), chain[0].get()); // too deep
-  mid.setOwner(&leaf);
-  EXPECT_EQ(leaf.ancestor("Missing"), &leaf); // a loop
+  ModelBase one("One"), two("Two");
+  one.setOwner(&two);
+  two.setOwner(&one);
+  EXPECT_EQ(one.ancestor("Missing"), &one); // a loop
   subscription.unsubscribe();
 
   const std::pair<int, std::string> warning{3, "There may be a loop or deep node in models."};
@@ -174,10 +154,10 @@ TEST_F(ModelBaseTest, AncestorCountsItselfFirstAndStopsOnLoopsWithWarning) {
 }
 
 TEST_F(ModelBaseTest, ResetRestoresResettableSettingsUnderOneCoupling) {
-  Oscillux inactive;
+  Probe inactive;
   inactive.change();
   inactive.reset();
-  EXPECT_EQ(inactive.level->getValue(), 1.5);
+  EXPECT_EQ(inactive.level->getValue(), -10.0);
   EXPECT_EQ(inactive.label->getValue(), "idle");
   // The shared empty transaction of an inactive reset keeps its option.
   EXPECT_EQ(Transaction::empty()->getOption(), TransactionOption::NoCouple);
@@ -188,36 +168,35 @@ TEST_F(ModelBaseTest, ResetRestoresResettableSettingsUnderOneCoupling) {
   EXPECT_EQ(couples, 1);
   EXPECT_EQ(method, "Reset");
   EXPECT_EQ(option, TransactionOption::Reset);
-  EXPECT_EQ(model->level->getValue(), 1.5);
+  EXPECT_EQ(model->level->getValue(), -10.0);
 }
 
-TEST_F(ModelBaseTest, CopyFromTakesSameClassOnlyByPositionInOneEdit) {
-  auto source = std::make_shared<Oscillux>();
+TEST_F(ModelBaseTest, CopyFromTakesSameClassOnlyByPositionInOneSilentEdit) {
+  auto source = std::make_shared<Probe>();
   source->change();
   EXPECT_FALSE(model->copyFrom(nullptr));
   EXPECT_FALSE(model->copyFrom(model));
-  EXPECT_FALSE(model->copyFrom(std::make_shared<OscilluxTwin>())); // same layout, another class
+  EXPECT_FALSE(model->copyFrom(std::make_shared<Twin>())); // same layout, another class
   EXPECT_EQ(couples, 0);
 
-  int notified = 0;
-  auto subscription = model->level->getSubject().get_observable().subscribe([&](const SettingChange &) { ++notified; });
+  Testing::Notifications notes;
+  notes.watch(*model);
   EXPECT_TRUE(model->copyFrom(source));
-  subscription.unsubscribe();
   EXPECT_EQ(couples, 1);
   EXPECT_EQ(option, TransactionOption::Couple);
-  EXPECT_EQ(notified, 0);
+  EXPECT_TRUE(notes.take().empty());
   EXPECT_EQ(model->level->getValue(), 7.25);
   EXPECT_TRUE(model->equals(source));
 }
 
 TEST_F(ModelBaseTest, DuplicateIsAnInactiveCopyAndEqualsNeedsTheSameClass) {
-  Oscillux parent;
+  Probe parent;
   model->setOwner(&parent);
   model->setThisKey("Slot");
   model->getMetadata().setText("Note", "only here");
   model->change();
 
-  auto copy = std::dynamic_pointer_cast<Oscillux>(model->duplicate());
+  auto copy = std::dynamic_pointer_cast<Probe>(model->duplicate());
   ASSERT_NE(copy, nullptr);
   EXPECT_EQ(copy->getOwner(), nullptr);
   EXPECT_EQ(copy->getInterceptor(), nullptr);
@@ -225,11 +204,11 @@ TEST_F(ModelBaseTest, DuplicateIsAnInactiveCopyAndEqualsNeedsTheSameClass) {
   EXPECT_EQ(copy->getThisKey(), "");
   EXPECT_EQ(copy->level->getValue(), 7.25);
   EXPECT_TRUE(copy->equals(model)); // keys and metadata do not count
-  copy->taps->setValue(99);
+  copy->shadow->setValue(99);
   EXPECT_FALSE(model->equals(copy));
   EXPECT_FALSE(copy->equals(nullptr));
   EXPECT_TRUE(copy->equals(copy));
-  EXPECT_FALSE(std::make_shared<Oscillux>()->equals(std::make_shared<OscilluxTwin>()));
+  EXPECT_FALSE(std::make_shared<Probe>()->equals(std::make_shared<Twin>()));
 }
 
 TEST(MetadataTest, TextAndTypedEntriesReplaceRatherThanMisread) {

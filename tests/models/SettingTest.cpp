@@ -1,14 +1,10 @@
+#include "support/TestModels.h"
 #include "wavemill/models/ActionSetting.h"
-#include "wavemill/models/BoolSetting.h"
-#include "wavemill/models/DoubleSetting.h"
-#include "wavemill/models/Int32Setting.h"
-#include "wavemill/models/Int64Setting.h"
-#include "wavemill/models/ModelBase.h"
 #include "wavemill/models/SettingVisitor.h"
-#include "wavemill/models/SubSetting.h"
 
 #include <gtest/gtest.h>
 
+#include <array>
 #include <cmath>
 #include <limits>
 
@@ -16,24 +12,24 @@ using namespace Corvane::Wavemill;
 
 namespace {
 
-// Owns the settings under test, binds them to its own tree and counts the
-// owner calls.
-struct Holder : ModelBase {
-  void activate() { activateSettings(&tree, nullptr); }
-  void onPropertyChanged(ISetting *) override { ++ownerCalls; }
-  Interceptor tree;
-  int ownerCalls = 0;
-};
-
 // Writes `value` and hands the setting back for a read.
 template <class S, class V> S &set(S &setting, const V &value) {
   setting.setValue(value);
   return setting;
 }
 
+// A live Source that also binds loose settings to its tree.
+struct SettingTest : testing::Test, Testing::LiveTree<Testing::Source> {
+  template <class S, class... A> std::shared_ptr<S> live(A... arguments) {
+    auto setting = std::make_shared<S>(arguments...);
+    setting->activate(&interceptor, root.get());
+    return setting;
+  }
+};
+
 } // namespace
 
-TEST(SettingTest, InactiveSettingStoresAnyValueAsGivenAndPublishesNothing) {
+TEST(InactiveSettingTest, StoresAnyValueAsGivenAndPublishesNothing) {
   DoubleSetting level("Level", 1.0, 0.0, 10.0, 0.0);
   int published = 0;
   auto counting = level.getSubject().get_observable().subscribe([&](const SettingChange &) { ++published; });
@@ -45,27 +41,25 @@ TEST(SettingTest, InactiveSettingStoresAnyValueAsGivenAndPublishesNothing) {
   EXPECT_EQ(published, 0);
 }
 
-TEST(SettingTest, ActiveWritesFollowTheValidationRuleOfTheClass) {
-  Holder holder;
-  auto stepped = holder.init(std::make_shared<DoubleSetting>("D", 0.0, 0.0, 100.0, 0.5));
-  auto clipped = holder.init(std::make_shared<DoubleSetting>("C", 0.0, -1.0, 1.0, 0.0));
-  auto l = holder.init(std::make_shared<Int64Setting>("L", 0, -1000, 100, 10));
-  auto lc = holder.init(std::make_shared<Int64Setting>("LC", 0, -5, 5, 0));
-  auto i = holder.init(std::make_shared<Int32Setting>("I", 0, 0, 100, 0));
-  holder.activate();
-
-  // The step replaces clipping and the half step is added to the value.
-  EXPECT_DOUBLE_EQ(set(*stepped, -3.0).getValue(), -2.75);
-  EXPECT_EQ(set(*clipped, 7.0).getValue(), 1.0);
-  EXPECT_EQ(set(*clipped, -7.0).getValue(), -1.0);
-  EXPECT_TRUE(std::isnan(set(*clipped, std::nan("")).getValue()));
-  EXPECT_EQ(set(*l, 1234).getValue(), 1230);
-  EXPECT_EQ(set(*l, -7).getValue(), 0);
-  EXPECT_EQ(set(*lc, 99).getValue(), 5);
-  EXPECT_EQ(set(*lc, -99).getValue(), -5);
+TEST_F(SettingTest, ActiveWritesFollowTheValidationRuleOfTheClass) {
+  // With a step the half step is added and nothing is clipped; without one
+  // the value is clipped to the range.
+  for (auto [step, low, high, in, out] : std::vector<std::array<double, 5>>{
+           {0.5, 0.0, 100.0, -3.0, -2.75}, {0.0, -1.0, 1.0, 7.0, 1.0}, {0.0, -1.0, 1.0, -7.0, -1.0}}) {
+    SCOPED_TRACE(testing::Message() << "double step " << step << " write " << in);
+    EXPECT_DOUBLE_EQ(set(*live<DoubleSetting>("D", 0.0, low, high, step), in).getValue(), out);
+  }
+  EXPECT_TRUE(std::isnan(set(*live<DoubleSetting>("C", 0.0, -1.0, 1.0, 0.0), std::nan("")).getValue()));
+  // A 64-bit step rounds down towards zero instead of clipping.
+  for (auto [step, low, high, in, out] : std::vector<std::array<std::int64_t, 5>>{
+           {10, -1000, 100, 1234, 1230}, {10, -1000, 100, -7, 0}, {0, -5, 5, 99, 5}, {0, -5, 5, -99, -5}}) {
+    SCOPED_TRACE(testing::Message() << "int64 step " << step << " write " << in);
+    EXPECT_EQ(set(*live<Int64Setting>("L", std::int64_t{0}, low, high, step), in).getValue(), out);
+  }
 
   // Writes to a 32-bit setting are kept as given; the rule is only there to
   // be called by name.
+  auto i = live<Int32Setting>("I", 0, 0, 100, 0);
   EXPECT_EQ(set(*i, 1000).getValue(), 1000);
   EXPECT_EQ(i->validateValue(1000), 100);
   EXPECT_EQ(i->validateValue(-1), 0);
@@ -73,7 +67,7 @@ TEST(SettingTest, ActiveWritesFollowTheValidationRuleOfTheClass) {
   EXPECT_EQ(i->validateValue(1234), 1230);
 }
 
-TEST(SettingTest, ParseStoresWithoutValidationAndReportsFailure) {
+TEST(SettingParseTest, StoresWithoutValidationAndReportsFailure) {
   BoolSetting b("B");
   EXPECT_TRUE(b.parse("TRUE"));
   EXPECT_TRUE(b.getValue());
@@ -100,7 +94,7 @@ TEST(SettingTest, ParseStoresWithoutValidationAndReportsFailure) {
   EXPECT_EQ(d.getValue(), 2500.0); // outside the range: parse bypasses validation
 }
 
-TEST(SettingTest, TextFormsAndTypeErasedDoor) {
+TEST(SettingTextTest, TextFormsAndTypeErasedDoor) {
   DoubleSetting d("D");
   EXPECT_EQ(set(d, 1e6).toString(), "1000000");
   EXPECT_EQ(set(d, 0.1).toString(), "0.1");
@@ -131,7 +125,7 @@ TEST(SettingTest, TextFormsAndTypeErasedDoor) {
   EXPECT_EQ(s.getValue(), "text");
 }
 
-TEST(SettingTest, EqualsCopyFromParseAndResetWorkOnValuesOnly) {
+TEST(SettingValueTest, EqualsCopyFromParseAndResetWorkOnValuesOnly) {
   auto a = std::make_shared<Int32Setting>("A", 3, 0, 10, 0);
   auto b = std::make_shared<Int32Setting>("B", 3, 0, 10, 0);
   auto l = std::make_shared<Int64Setting>("L", 3, 0, 10, 0);
@@ -155,29 +149,29 @@ TEST(SettingTest, EqualsCopyFromParseAndResetWorkOnValuesOnly) {
   EXPECT_EQ(a->getValue(), 9);
 }
 
-TEST(SettingTest, FlagChangesNotifyOwnerAndObserversOnlyWhenTheWordChanges) {
-  Holder holder;
-  auto s = holder.init(std::make_shared<StringSetting>("S"));
+TEST(SettingFlagTest, FlagChangesNotifyOwnerAndObserversOnlyWhenTheWordChanges) {
+  auto source = std::make_shared<Testing::Source>();
+  auto &s = source->label;
   std::vector<ParameterBits> bits;
   auto probe = s->getSubject().get_observable().subscribe([&](const SettingChange &c) { bits.push_back(c.bits); });
   s->setReadOnly(true); // inactive: owner null, nothing published
-  holder.activate();
+  Testing::LiveTree<Testing::Source> tree(source);
   s->setReadOnly(true); // no change of the word
   EXPECT_TRUE(bits.empty());
-  EXPECT_EQ(holder.ownerCalls, 0);
+  EXPECT_TRUE(source->events.empty());
 
   s->setVisible(false);
   s->setPersisted(false);
   s->setResettable(false);
   s->setReadOnly(false);
-  EXPECT_EQ(holder.ownerCalls, 4);
+  EXPECT_EQ(source->events.size(), 4u);
   EXPECT_EQ(bits, (std::vector<ParameterBits>{ParameterBits::Visible, ParameterBits::Persisted,
                                               ParameterBits::Resettable, ParameterBits::ReadOnly}));
   EXPECT_FALSE(s->isVisible());
   probe.unsubscribe();
 }
 
-TEST(SettingTest, ActionInvokesHandlersInOrderAndPassesFailures) {
+TEST(ActionSettingTest, InvokesHandlersInOrderAndPassesFailures) {
   ActionSetting action("Run");
   action.invoke(); // no handlers: nothing happens
   std::string calls;
@@ -196,8 +190,10 @@ TEST(SettingTest, ActionInvokesHandlersInOrderAndPassesFailures) {
   EXPECT_THROW(empty.invoke(), std::bad_function_call);
 }
 
-// Sub-model holders take the general overload.
-TEST(SettingTest, VisitCallsTheOverloadOfTheSettingsClass) {
+// Sub-model holders take the general overload. An enum setting, as an
+// application writes it, is an Int32Setting subclass that fills the list
+// the first read creates and sets EnumKind.
+TEST(SettingKindTest, VisitCallsTheOverloadOfTheSettingsClassAndEnumKindServesEnumSubclasses) {
   struct KindVisitor : SettingVisitor {
     void dispatch(ISetting *) override { seen += "I"; }
     void dispatch(ContextSetting *) override { seen += "C"; }
@@ -214,11 +210,7 @@ TEST(SettingTest, VisitCallsTheOverloadOfTheSettingsClass) {
            std::make_shared<ActionSetting>(), std::make_shared<SubSetting<ModelBase>>()})
     setting->visit(&visitor);
   EXPECT_EQ(visitor.seen, "BiLDSSSI");
-}
 
-TEST(SettingTest, EnumKindAndTheValidValuesListServeEnumSubclasses) {
-  // An enum setting as an application writes it: an Int32Setting subclass
-  // that fills the list the first read creates and sets EnumKind.
   struct Waveform : Int32Setting {
     Waveform() {
       getValidInt32Values();

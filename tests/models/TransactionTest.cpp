@@ -1,8 +1,4 @@
-#include "wavemill/models/BoolSetting.h"
-#include "wavemill/models/Couplings.h"
-#include "wavemill/models/DoubleSetting.h"
-#include "wavemill/models/Int32Setting.h"
-#include "wavemill/models/ModelBase.h"
+#include "support/TestModels.h"
 #include "wavemill/services/ServiceBase.h"
 
 #include <gtest/gtest.h>
@@ -10,47 +6,39 @@
 #include <thread>
 
 using namespace Corvane::Wavemill;
+using Testing::Source;
 
 namespace {
 
 using Events = std::vector<std::string>;
 
-// A model whose owner calls, setting observers and Interceptor observer all
-// write to one event log.
-class Source : public ModelBase {
-public:
-  Source() : ModelBase("Tests::Source") {}
-  std::shared_ptr<IModel> getPrototype() const override { return Prototype::getInstance<Source>(); }
-  void onPropertyChanged(ISetting *setting) override { events.push_back("owner:" + setting->getName()); }
-  void onCouple(Couplings::Function function) { setCouplings(std::make_shared<Couplings>(std::move(function))); }
-
-  Events events;
-  std::shared_ptr<DoubleSetting> frequency = init(std::make_shared<DoubleSetting>("Frequency"));
-  std::shared_ptr<DoubleSetting> period = init(std::make_shared<DoubleSetting>("Period"));
-  std::shared_ptr<BoolSetting> on = init(std::make_shared<BoolSetting>("On"));
-  std::shared_ptr<Int32Setting> count = init(std::make_shared<Int32Setting>("Count"));
-};
-
-// An active tree of one Source.
-struct Tree {
+// A live Source whose owner calls, setting notifications and tree
+// notifications all land in one log.
+struct Tree : Testing::LiveTree<Source> {
   Tree() {
-    root->activateSettings(&interceptor, nullptr);
-    for (const auto &setting : root->getAllSettings())
-      setting->getSubject().get_observable().subscribe(
-          [this](const SettingChange &change) { events.push_back("setting:" + change.setting->getName()); });
-    interceptor.getSubject().get_observable().subscribe(
-        [this](ISetting *setting) { events.push_back("tree:" + setting->getName()); });
+    notes.watch(*root);
+    notes.watch(interceptor);
   }
-  std::shared_ptr<Source> root = std::make_shared<Source>();
-  Interceptor interceptor{root};
   Events &events = root->events;
+  Testing::Notifications notes{events};
 };
 
-class TransactionTest : public testing::Test, public Tree {};
+class TransactionTest : public testing::Test, public Tree {
+protected:
+  // Counts the couplings of the root and keeps the last method name.
+  void countCouples() {
+    root->onCouple([this](ModelBase *, Transaction *transaction) {
+      ++couples;
+      method = transaction->getMethodName();
+    });
+  }
+  int couples = 0;
+  std::string method;
+};
 
 } // namespace
 
-TEST_F(TransactionTest, AWriteNotifiesOwnerSettingAndTreeThenCouplesOnce) {
+TEST_F(TransactionTest, AWriteNotifiesOwnerSettingAndTreeThenCouplesOnceAndCouplingWritesAreNested) {
   root->onCouple([&](ModelBase *, Transaction *transaction) {
     events.push_back("couple");
     EXPECT_EQ(transaction->getOption(), TransactionOption::Couple);
@@ -67,29 +55,28 @@ TEST_F(TransactionTest, AWriteNotifiesOwnerSettingAndTreeThenCouplesOnce) {
   events.clear();
   root->frequency->setValue(1e6);
   EXPECT_EQ(events, Events{"couple"});
-}
 
-TEST_F(TransactionTest, CouplingWritesAreNestedAndNeverCoupleAgain) {
-  int couples = 0;
+  // Writes of the coupling are nested: they notify but never couple again,
+  // not even a write of the setting that started the change.
+  events.clear();
   root->onCouple([&](ModelBase *, Transaction *) {
     ++couples;
-    root->period->setValue(1.0 / root->frequency->getValue());
-    root->frequency->setValue(root->frequency->getValue()); // writes its own trigger: no recursion
+    root->level->setValue(root->frequency->getValue() / 1e3);
+    root->frequency->setValue(root->frequency->getValue());
   });
-  root->frequency->setValue(4.0);
+  root->frequency->setValue(4e3);
   EXPECT_EQ(couples, 1);
-  EXPECT_DOUBLE_EQ(root->period->getValue(), 0.25);
-  EXPECT_EQ(events, (Events{"owner:Frequency", "setting:Frequency", "tree:Frequency", "owner:Period", "setting:Period",
-                            "tree:Period"}));
+  EXPECT_EQ(root->level->getValue(), 4.0);
+  EXPECT_EQ(events, (Events{"owner:Frequency", "setting:Frequency", "tree:Frequency", "owner:Level", "setting:Level",
+                            "tree:Level"}));
 }
 
 TEST_F(TransactionTest, ReadOnlyWriteKeepsValueAndLeavesTheThreadInside) {
-  int couples = 0;
-  root->onCouple([&](ModelBase *, Transaction *) { ++couples; });
+  countCouples();
   root->count->setReadOnly(true);
   events.clear();
   root->count->setValue(5);
-  EXPECT_EQ(root->count->getValue(), 0);
+  EXPECT_EQ(root->count->getValue(), 3);
   EXPECT_TRUE(events.empty());
   EXPECT_EQ(couples, 0);
   EXPECT_EQ(interceptor.getThreadId(), Interceptor::currentThreadId());
@@ -98,7 +85,7 @@ TEST_F(TransactionTest, ReadOnlyWriteKeepsValueAndLeavesTheThreadInside) {
 
   // This thread now counts as inside: the next writes are nested, even on
   // the read-only setting, and nothing couples.
-  root->frequency->setValue(2.0);
+  root->frequency->setValue(2e3);
   root->count->setValue(6);
   EXPECT_EQ(root->count->getValue(), 6);
   EXPECT_EQ(couples, 0);
@@ -108,19 +95,19 @@ TEST_F(TransactionTest, ReadOnlyWriteKeepsValueAndLeavesTheThreadInside) {
   std::thread([&] { root->on->setValue(true); }).join();
   EXPECT_EQ(couples, 1);
   EXPECT_EQ(interceptor.getThreadId(), 0u);
-  root->frequency->setValue(3.0);
+  root->frequency->setValue(3e3);
   EXPECT_EQ(couples, 2);
 }
 
 TEST_F(TransactionTest, CouplingFailureIsSwallowedObserverFailureReachesTheWriter) {
   auto &lock = interceptor.getMutex();
   root->onCouple([](ModelBase *, Transaction *) { throw std::runtime_error("coupling"); });
-  EXPECT_NO_THROW(root->frequency->setValue(5.0));
-  EXPECT_EQ(root->frequency->getValue(), 5.0);
+  EXPECT_NO_THROW(root->frequency->setValue(5e3));
+  EXPECT_EQ(root->frequency->getValue(), 5e3);
   EXPECT_EQ(interceptor.getThreadId(), 0u);
   {
     auto edit = root->beginEdit();
-    root->frequency->setValue(6.0);
+    root->frequency->setValue(6e3);
   } // the coupling throws inside the destructor: swallowed
   EXPECT_EQ(interceptor.getThreadId(), 0u);
   EXPECT_TRUE(lock.try_lock());
@@ -140,8 +127,6 @@ TEST_F(TransactionTest, CouplingFailureIsSwallowedObserverFailureReachesTheWrite
 }
 
 TEST_F(TransactionTest, SyncTransactionGroupsWritesAndCouplesOnceAtTheEnd) {
-  int couples = 0;
-  std::string method;
   root->onCouple([&](ModelBase *, Transaction *transaction) {
     ++couples;
     method = transaction->getMethodName();
@@ -150,7 +135,7 @@ TEST_F(TransactionTest, SyncTransactionGroupsWritesAndCouplesOnceAtTheEnd) {
   {
     auto edit = root->beginEdit(TransactionOption::Couple);
     EXPECT_NE(edit, Transaction::empty());
-    root->frequency->setValue(1.0);
+    root->frequency->setValue(1e3);
     root->on->setValue(true);
     EXPECT_EQ(events.size(), 6u); // notified at once
     EXPECT_EQ(couples, 0);
@@ -176,7 +161,7 @@ TEST_F(TransactionTest, SyncTransactionGroupsWritesAndCouplesOnceAtTheEnd) {
   couples = 0;
   {
     auto quiet = root->beginEdit(TransactionOption::NoCouple);
-    root->count->setValue(3);
+    root->count->setValue(4);
   }
   EXPECT_EQ(couples, 0);
   EXPECT_EQ(interceptor.getThreadId(), 0u);
@@ -197,15 +182,15 @@ TEST_F(TransactionTest, InactiveEditsGetTheSharedEmptyTransaction) {
 }
 
 TEST_F(TransactionTest, CouplingsComeFromThePrototypeUnlessTheInstanceHasItsOwn) {
-  int shared = 0, own = 0;
+  int shared = 0;
   auto prototype = Prototype::getInstance<Source>();
   prototype->onCouple([&](ModelBase *, Transaction *) { ++shared; });
-  root->frequency->setValue(1.0);
-  root->onCouple([&](ModelBase *, Transaction *) { ++own; });
-  root->frequency->setValue(2.0);
+  root->frequency->setValue(1e3);
+  countCouples();
+  root->frequency->setValue(2e3);
   prototype->setCouplings(nullptr);
   EXPECT_EQ(shared, 1);
-  EXPECT_EQ(own, 1);
+  EXPECT_EQ(couples, 1);
 }
 
 TEST_F(TransactionTest, PropagationEntersAnotherTreeOnceAndGuardsLoops) {
@@ -222,14 +207,14 @@ TEST_F(TransactionTest, PropagationEntersAnotherTreeOnceAndGuardsLoops) {
     EXPECT_EQ(transaction->propagate(root.get(), PropagationOption::PropagateOnly, TransactionOption::Couple),
               Transaction::empty());
     auto into = transaction->propagate(second.root, PropagationOption::PropagateWithOption, TransactionOption::Couple);
-    second.root->period->setValue(root->frequency->getValue() * 2);
+    second.root->count->setValue(static_cast<int>(root->frequency->getValue() / 500));
   });
-  root->frequency->setValue(21.0);
-  EXPECT_EQ(second.root->period->getValue(), 42.0);
+  root->frequency->setValue(21e3);
+  EXPECT_EQ(second.root->count->getValue(), 42);
   EXPECT_EQ(secondCouples, 1);
 
-  // Option 1 couples the target at once; inside the target tree already,
-  // beginEdit gives the empty transaction and that is what the coupling gets.
+  // PropagateAndCouple couples the target at once; inside the target tree
+  // already, beginEdit gives the empty transaction and the coupling gets it.
   Transaction *coupledWith = nullptr;
   second.root->onCouple([&](ModelBase *, Transaction *transaction) { coupledWith = transaction; });
   auto edit = second.root->beginEdit(TransactionOption::NoCouple);

@@ -35,8 +35,7 @@ struct Source : ModelBase {
   void onCouple(Couplings::Function function) { setCouplings(std::make_shared<Couplings>(std::move(function))); }
 
   std::vector<std::string> events;
-  std::shared_ptr<DoubleSetting> frequency =
-      init(std::make_shared<DoubleSetting>("Frequency", 1e9, 1e3, 40e9, 0.0));
+  std::shared_ptr<DoubleSetting> frequency = init(std::make_shared<DoubleSetting>("Frequency", 1e9, 1e3, 40e9, 0.0));
   std::shared_ptr<DoubleSetting> level = init(std::make_shared<DoubleSetting>("Level", -10.0, -130.0, 20.0, 0.0));
   std::shared_ptr<BoolSetting> on = init(std::make_shared<BoolSetting>("On"));
   std::shared_ptr<Int32Setting> count = init(std::make_shared<Int32Setting>("Count", 3, 0, 100, 0));
@@ -70,9 +69,16 @@ template <class Root> struct LiveTree {
 };
 
 /// Collects, in order and from any thread, the notifications of the settings
-/// of one model ("setting:<name>") and of a tree ("tree:<name>").
+/// of one model ("setting:<name>") and of a tree ("tree:<name>"). Given a
+/// log, it writes into that one, so that they interleave with other entries
+/// (such as a Source's owner calls) written on the same thread.
 class Notifications {
 public:
+  Notifications() = default;
+  explicit Notifications(std::vector<std::string> &log) : seen(&log) {}
+  Notifications(const Notifications &) = delete;
+  Notifications &operator=(const Notifications &) = delete;
+
   /// Records the changes of every setting `model` has now.
   void watch(ModelBase &model) {
     for (const auto &setting : model.getAllSettings())
@@ -87,7 +93,7 @@ public:
   /// What was recorded so far, and forgets it.
   std::vector<std::string> take() {
     std::lock_guard<std::mutex> lock(mutex);
-    return std::exchange(seen, {});
+    return std::exchange(*seen, {});
   }
   ~Notifications() {
     for (auto &subscription : subscriptions)
@@ -97,10 +103,11 @@ public:
 private:
   void add(std::string text) {
     std::lock_guard<std::mutex> lock(mutex);
-    seen.push_back(std::move(text));
+    seen->push_back(std::move(text));
   }
   std::mutex mutex;
-  std::vector<std::string> seen;
+  std::vector<std::string> own;
+  std::vector<std::string> *seen = &own;
   std::vector<rx::subscription> subscriptions;
 };
 
