@@ -25,19 +25,12 @@ namespace {
 // Switches the whole process to `name` for the scope, as a desktop
 // application does with setlocale(LC_ALL, ""), and switches back also when
 // an assertion ends the test early.
-class ProcessLocale {
-public:
-  explicit ProcessLocale(const char *name) : previous(std::setlocale(LC_ALL, nullptr)) {
-    switched = std::setlocale(LC_ALL, name) != nullptr;
-  }
+struct ProcessLocale {
+  explicit ProcessLocale(const char *name)
+      : previous(std::setlocale(LC_ALL, nullptr)), switched(std::setlocale(LC_ALL, name) != nullptr) {}
   ~ProcessLocale() { std::setlocale(LC_ALL, previous.c_str()); }
-  ProcessLocale(const ProcessLocale &) = delete;
-  ProcessLocale &operator=(const ProcessLocale &) = delete;
-
-  bool switched = false;
-
-private:
-  std::string previous;
+  const std::string previous;
+  const bool switched;
 };
 
 constexpr const char *german = "de_DE.UTF-8";
@@ -110,39 +103,29 @@ TEST(NumberTextTest, SettingsToolsConvertersAndDocumentsKeepTheDecimalPointUnder
     DoubleSetting setting("Level");
     return setting.parse(text) ? setting.getDouble() : -99.0;
   };
-  const auto tried = [](const char *text) {
-    double value = -99.0;
-    return Tools::tryParse(text, value) ? value : -99.0;
-  };
-  const auto converted = [](const char *text) {
-    DoubleSetting setting("Level");
-    Prototype::getInstance<DoubleConverter>()->convertBack(&setting, text);
-    return setting.getDouble();
-  };
-  const auto displayedMinimum = [](const char *object) {
-    DoubleSetting setting("Level");
-    JsonToSettingVisitor visitor(JsonSerializer::parse(object));
-    setting.visit(&visitor);
-    return setting.getMinimum();
-  };
+  double tried = -99.0;
+  EXPECT_TRUE(Tools::tryParse(" -1.5E-3", tried));
+  DoubleSetting converted("Level"), displayed("Level");
+  Prototype::getInstance<DoubleConverter>()->convertBack(&converted, "2.5");
+  JsonToSettingVisitor reader(JsonSerializer::parse(R"({"Value": 1, "Min": -0.25})"));
+  displayed.visit(&reader);
   const std::vector<double> array = Tools::parseDoubleArray("0.5, -1.25", ",");
-  struct Read {
+  const struct {
     const char *what;
     double read;
     double expected;
-  };
-  const Read reads[] = {
+  } reads[] = {
       {"DoubleSetting::parse 2.5", parsed("2.5"), 2.5},
       {"DoubleSetting::parse 1e-3", parsed("1e-3"), 1e-3},
       {"DoubleSetting::parse -0.5", parsed("-0.5"), -0.5},
       {"Tools::parseDouble", Tools::parseDouble(" 2.5V", 0), 2.5},
       {"Tools::parseFloat", Tools::parseFloat("0.25", 0), 0.25},
-      {"Tools::tryParse", tried(" -1.5E-3"), -1.5e-3},
+      {"Tools::tryParse", tried, -1.5e-3},
       {"Tools::parseDoubleArray", array.size() == 2 ? array[0] + array[1] : -99.0, -0.75},
-      {"DoubleConverter::convertBack", converted("2.5"), 2.5},
-      {"display data Min", displayedMinimum(R"({"Value": 1, "Min": -0.25})"), -0.25},
+      {"DoubleConverter::convertBack", converted.getDouble(), 2.5},
+      {"display data Min", displayed.getMinimum(), -0.25},
   };
-  for (const Read &row : reads) {
+  for (const auto &row : reads) {
     SCOPED_TRACE(row.what);
     EXPECT_EQ(row.read, row.expected);
   }
@@ -150,17 +133,16 @@ TEST(NumberTextTest, SettingsToolsConvertersAndDocumentsKeepTheDecimalPointUnder
   DoubleSetting half("Half", 0.5, -0.25, 2.5, 0.0);
   SettingToJsonVisitor display;
   half.visit(&display);
-  struct Written {
+  const struct {
     const char *what;
     std::string text;
     const char *expected;
-  };
-  const Written writes[] = {
+  } writes[] = {
       {"DoubleSetting::toString", half.toString(), "0.5"},
       {"display data Min", display.getCurrent()->getItem("Min")->toString(), "-0.25"},
       {"display data Max", display.getCurrent()->getItem("Max")->toString(), "2.5"},
   };
-  for (const Written &row : writes) {
+  for (const auto &row : writes) {
     SCOPED_TRACE(row.what);
     EXPECT_EQ(row.text, row.expected);
   }

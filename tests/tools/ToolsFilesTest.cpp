@@ -6,11 +6,16 @@
 
 #include <gtest/gtest.h>
 
+#include <dlfcn.h>
+#include <link.h>
+
 #include <filesystem>
 #include <fstream>
 #include <limits>
+#include <map>
 #include <memory>
 #include <string>
+#include <utility>
 #include <vector>
 
 using namespace Corvane::Wavemill;
@@ -20,61 +25,102 @@ namespace {
 
 void anchorInTestProgram() {}
 
+// A temporary folder and a file in it with the text a test reads back.
+class ToolsFileTest : public ::testing::Test {
+protected:
+  std::string file(const std::string &text, const std::string &name = "f") {
+    Tools::writeText(dir.path(name), text);
+    return dir.path(name);
+  }
+  // The entries of a map in their order as "[key]value", for a compact expectation.
+  static std::string flat(const std::map<std::string, std::string> &entries) {
+    std::string result;
+    for (const auto &[key, value] : entries)
+      result += "[" + key + "]" + value;
+    return result;
+  }
+  TempDir dir;
+};
+
 } // namespace
 
-TEST(ToolsTest, FindFileMatchesTheEndOfThePathDepthFirstIgnoringCase) {
-  TempDir dir;
-  Path::createDirectory(dir.path("sub/deep"));
-  Tools::writeText(dir.path("readme.TXT"), "");
-  Tools::writeText(dir.path("sub/deep/target.cfg"), "");
-  Tools::writeText(dir.path("t.dat"), "");
-  Tools::writeText(dir.path("sub/t.dat"), "");
+TEST_F(ToolsFileTest, ReadConfigTrimsKeysAndValuesAndLetsTheLastRepeatWin) {
+  EXPECT_EQ(flat(Tools::readConfig(file("  name = \"Lumenbay\"  \npath\t=\t'C:\\data'\nurl=http://host/?a=b\n=no key\n"
+                                        "# a line without delimiter\n\na=1\na=2\ncrlf=yes\r\nempty="),
+                                   "=")),
+            "[]no key[a]2[crlf]yes[empty][name]Lumenbay[path]C:\\data[url]http://host/?a=b");
+  // With other delimiters a line without one is a key of its own.
+  EXPECT_EQ(flat(Tools::readConfig(file("x: 1\ny;2\nplain line\na=b\n"), ":;")), "[a=b][plain line][x]1[y]2");
+  EXPECT_EQ(Tools::readLines(file("a\r\n b \n\nc")), (std::vector<std::string>{"a", " b ", "", "c"}));
+}
 
+TEST_F(ToolsFileTest, ReadXmlKeysOneElementPerLineByItsPath) {
+  const std::pair<const char *, const char *> rows[] = {
+      // Comments, values over several lines, a stray ">", a wrong end tag and a "<" that ends a name.
+      {"<?xml version=\"1.0\"?>\n<root>\n  <name>Lumenbay</name>  \r\n  <!-- one line -->\n  <device id=\"7\">\n"
+       "    <address>\npart1\npart2\t\n    </address>\n    <!--\ntext of a comment\n    -->\n  only > one\n"
+       "  </device>\n  <empty></empty>\n  <other>x</wrong>\n  </other>\n  <odd<>v</odd<>\n</root>\n",
+       "[root][root.device][root.device.address]part1part2[root.empty][root.name]Lumenbay[root.odd<]v[root.other]"},
+      // Repeated elements are numbered, and so are the keys of their children.
+      {"<list>\n<item>\n<v>1</v>\n</item>\n<item>\n<v>2</v>\n</item>\n<item>3</item>\n</list>\n<list>\n</list>\n",
+       "[list][list.1][list.item][list.item.1][list.item.1.v]2[list.item.2]3[list.item.v]1"},
+      // Only the first tag of a line counts, and a self-closing tag stays open.
+      {"<a><b>x</b>\n</a>\n", "[a]"},
+      {"<r>\n<flag/>\n<v>1</v>\n</r>\n", "[r.flag.v]1"},
+  };
+  for (const auto &[text, expected] : rows)
+    EXPECT_EQ(flat(Tools::readXml(file(text))), expected) << text;
+}
+
+TEST_F(ToolsFileTest, ReadersOfAnUnreadablePathYieldNothing) {
+  for (const auto &path : {dir.path("absent"), dir.root(), std::string()}) {
+    SCOPED_TRACE(path);
+    EXPECT_TRUE(Tools::readConfig(path, "=").empty());
+    EXPECT_TRUE(Tools::readXml(path).empty());
+    EXPECT_TRUE(Tools::readLines(path).empty());
+    EXPECT_EQ(Tools::readText(path), "");
+    ASSERT_NE(Tools::readFile(path), nullptr);
+    EXPECT_TRUE(Tools::readFile(path)->empty());
+    EXPECT_EQ(Tools::fileSize(path), -1);
+    EXPECT_FALSE(Tools::exist(path));
+  }
+  Tools::writeText(dir.path("absent/a.txt"), "x");
+  EXPECT_FALSE(Tools::exist(dir.path("absent/a.txt")));
+  Tools::writeFile(dir.path("absent/a.bin"), {1});
+  EXPECT_FALSE(Path::directoryExist(dir.path("absent")));
+}
+
+TEST_F(ToolsFileTest, FindFileMatchesTheEndOfThePathDepthFirstIgnoringCase) {
+  Path::createDirectory(dir.path("sub/deep"));
+  for (const char *name : {"readme.TXT", "sub/deep/target.cfg", "t.dat", "sub/t.dat"})
+    file("", name);
   EXPECT_EQ(Tools::findFile(dir.root(), "target.cfg"), dir.path("sub/deep/target.cfg"));
   EXPECT_EQ(Tools::findFile(dir.root(), "DEEP\\Target.CFG"), dir.path("sub/deep/target.cfg"));
   EXPECT_EQ(Tools::findFile(dir.root(), "me.txt"), dir.path("readme.TXT"));
   EXPECT_EQ(Tools::findFile(dir.root(), "t.dat"), dir.path("t.dat"));
   EXPECT_EQ(Tools::findFile(dir.root(), "other/target.cfg"), "");
   EXPECT_EQ(Tools::findFile(dir.path("absent"), "t.dat"), "");
-
   // A link back up the tree must not make the search endless.
   std::filesystem::create_directory_symlink(dir.root(), dir.path("sub/deep/loop"));
   EXPECT_EQ(Tools::findFile(dir.root(), "absent.txt"), "");
-}
 
-TEST(ToolsTest, FilesAndSubDirectoriesListOneLevelOnly) {
-  TempDir dir;
-  Path::createDirectory(dir.path("sub/deeper"));
-  Tools::writeText(dir.path("a.txt"), "");
-  Tools::writeText(dir.path("sub/b.txt"), "");
-
-  EXPECT_EQ(Tools::getFiles(dir.root()), std::vector<std::string>{dir.path("a.txt")});
-  EXPECT_EQ(Tools::getSubDirectories(dir.root()), std::vector<std::string>{dir.path("sub")});
+  // Files and subfolders are listed one level deep only.
+  EXPECT_EQ(Tools::getFiles(dir.path("sub")), std::vector<std::string>{dir.path("sub/t.dat")});
+  EXPECT_EQ(Tools::getSubDirectories(dir.path("sub")), std::vector<std::string>{dir.path("sub/deep")});
   EXPECT_TRUE(Tools::getFiles(dir.path("absent")).empty());
-  EXPECT_TRUE(Tools::getSubDirectories(dir.path("a.txt")).empty());
+  EXPECT_TRUE(Tools::getSubDirectories(dir.path("t.dat")).empty());
 }
 
-TEST(ToolsTest, BinaryRoundTripKeepsEveryByteAndUnreadablePathsReadEmpty) {
-  TempDir dir;
+TEST_F(ToolsFileTest, BinaryRoundTripKeepsEveryByte) {
   const std::vector<unsigned char> bytes{0x00, 0xff, '\r', '\n', 0x1a, '\n', '\r', 0x00};
   Tools::writeFile(dir.path("a.bin"), bytes);
   EXPECT_EQ(*Tools::readFile(dir.path("a.bin")), bytes);
   EXPECT_EQ(Tools::fileSize(dir.path("a.bin")), 8);
   EXPECT_EQ(Tools::readText(dir.path("a.bin")), std::string(bytes.begin(), bytes.end()));
   EXPECT_TRUE(Tools::exist(dir.path("a.bin")));
-
-  for (const auto &unreadable : {dir.path("absent"), dir.root(), std::string()}) {
-    ASSERT_NE(Tools::readFile(unreadable), nullptr);
-    EXPECT_TRUE(Tools::readFile(unreadable)->empty());
-    EXPECT_EQ(Tools::fileSize(unreadable), -1);
-    EXPECT_FALSE(Tools::exist(unreadable));
-  }
-  Tools::writeFile(dir.path("absent/a.bin"), bytes);
-  EXPECT_FALSE(Path::directoryExist(dir.path("absent")));
 }
 
-TEST(ToolsTest, OpenWriteGivesTheFileItsFullSizeAtOnce) {
-  TempDir dir;
+TEST_F(ToolsFileTest, OpenWriteGivesTheFileItsFullSizeAtOnce) {
   std::ofstream stream;
   Tools::openWrite(stream, dir.path("big.bin"), 10);
   ASSERT_TRUE(stream.good());
@@ -96,9 +142,8 @@ TEST(ToolsTest, ModuleNamesNameThisLibraryAndTheTestProgram) {
   EXPECT_EQ(Tools::getLibraryName(), "wavemill");
   const auto library = Tools::getExecutingFileName();
   EXPECT_EQ(Path::getFileName(library).rfind("libwavemill.so", 0), 0U) << library;
-  EXPECT_EQ(Tools::getModuleFileName("wavemill"), library);
-  EXPECT_EQ(Tools::getModuleFileName(Path::getFileName(library)), library);
-  EXPECT_EQ(Tools::getModuleFileName("libwavemill.so"), library);
+  for (const auto &name : {std::string("wavemill"), Path::getFileName(library), std::string("libwavemill.so")})
+    EXPECT_EQ(Tools::getModuleFileName(name), library) << name;
 
   auto *anchor = reinterpret_cast<void *>(&anchorInTestProgram);
   const auto program = Tools::getProcessPath(-1);
@@ -112,6 +157,22 @@ TEST(ToolsTest, ModuleNamesNameThisLibraryAndTheTestProgram) {
   EXPECT_EQ(Tools::getModuleFileName("no-such-module"), "");
   EXPECT_EQ(Tools::getModuleFileName(""), "");
   EXPECT_EQ(Tools::getProcessPath(std::numeric_limits<int>::max()), "");
+}
+
+TEST(ToolsTest, LibraryNameLooksPastAnEarlierDotSoForTheVersionAtTheEnd) {
+  // The test plugin, built next to this program, loaded under a name whose
+  // first ".so" starts ".sock" and whose last is followed by a version.
+  const auto plugin = Path::getDirectoryName(Tools::getProcessPath(-1)) + "/libwavemill_test_plugin.so";
+  ASSERT_TRUE(Path::fileExist(plugin)) << "build the target wavemill_test_plugin first";
+  TempDir dir;
+  const auto renamed = dir.path("libwavemill_test_plugin.sock.so.1");
+  std::filesystem::copy_file(plugin, renamed);
+  void *module = ::dlopen(renamed.c_str(), RTLD_NOW | RTLD_LOCAL);
+  ASSERT_NE(module, nullptr) << ::dlerror();
+  link_map *loaded = nullptr;
+  ASSERT_EQ(::dlinfo(module, RTLD_DI_LINKMAP, &loaded), 0) << ::dlerror();
+  // The module stays loaded: the classes it registered must not lose their code.
+  EXPECT_EQ(Tools::getLibraryName(loaded->l_ld), "wavemill_test_plugin.sock");
 }
 
 TEST(OperationSystemTest, ReportsTheBuildPlatformAndComparesByFields) {

@@ -13,7 +13,6 @@
 #include <cstdint>
 #include <filesystem>
 #include <fstream>
-#include <iterator>
 #include <string>
 #include <thread>
 
@@ -28,11 +27,6 @@ bool listed(int pid) {
   return std::find(ids.begin(), ids.end(), pid) != ids.end();
 }
 
-std::string readAll(const std::string &path) {
-  std::ifstream file(path);
-  return std::string(std::istreambuf_iterator<char>(file), std::istreambuf_iterator<char>());
-}
-
 // Starts a shell that publishes its process id and then runs `script`; the id
 // is read back once the file is complete.
 int startShell(const TempDir &dir, const std::string &script, int timeoutInMS) {
@@ -43,7 +37,7 @@ int startShell(const TempDir &dir, const std::string &script, int timeoutInMS) {
             0);
   while (!fs::exists(pid)) // no time limit of its own: the test's time-out catches a lost shell
     std::this_thread::sleep_for(std::chrono::milliseconds(5));
-  return std::stoi(readAll(pid));
+  return std::stoi(Tools::readText(pid));
 }
 
 } // namespace
@@ -98,7 +92,7 @@ TEST(ToolsTest, StartProcessSplitsWordsLikeAShellAndExpandsNothing) {
     SCOPED_TRACE(row.words);
     fs::remove(out);
     ASSERT_EQ(Tools::startProcess(printWords + row.words, -1), 0);
-    EXPECT_EQ(readAll(out), row.expected); // written before startProcess returned
+    EXPECT_EQ(Tools::readText(out), row.expected); // written before startProcess returned
   }
 }
 
@@ -128,15 +122,13 @@ TEST(ToolsTest, KillProcessEndsAChildThatIsRunningListedAndOurs) {
   EXPECT_FALSE(Tools::killProcess(pid, 1));
 }
 
-TEST(ToolsTest, ProcessIdsOfNoProcessAreNeitherRunningNorKillableNorParents) {
+TEST(ToolsTest, ThisProcessIsListedRunningAndHasTheParentTheSystemKeepsButNoProcessIsNot) {
   for (int pid : {0, -1, INT_MAX})
     EXPECT_FALSE(Tools::isRunning(pid)) << pid;
   EXPECT_FALSE(Tools::killProcess(INT_MAX, 0));
   EXPECT_EQ(Tools::getParentProcessId(INT_MAX), 0);
   EXPECT_EQ(Tools::getParentProcessId(0), 0);
-}
 
-TEST(ToolsTest, ThisProcessIsListedRunningAndHasTheParentTheSystemKeeps) {
   const int self = Tools::getCurrentProcessId();
   EXPECT_TRUE(listed(self));
   EXPECT_TRUE(Tools::isRunning(self));
@@ -144,16 +136,14 @@ TEST(ToolsTest, ThisProcessIsListedRunningAndHasTheParentTheSystemKeeps) {
   EXPECT_EQ(Tools::getParentProcessId(self), Platform::currentParentProcessId());
 }
 
-TEST(ToolsTest, ThreadIdIsStableWithinAThreadAndDiffersBetweenThreads) {
+TEST(ToolsTest, ThreadIdIsStableWithinAThreadAndDiffersBetweenThreadsAndTheHostNameIsTheKernels) {
   const std::uint64_t mine = Tools::getCurrentThreadId();
   std::uint64_t other = 0;
   std::thread([&other] { other = Tools::getCurrentThreadId(); }).join();
   EXPECT_NE(mine, 0u);
   EXPECT_EQ(Tools::getCurrentThreadId(), mine);
   EXPECT_NE(other, mine);
-}
 
-TEST(ToolsTest, HostnameIsTheKernelsHostName) {
   std::string expected;
   std::getline(std::ifstream("/proc/sys/kernel/hostname"), expected);
   EXPECT_FALSE(Tools::getHostname().empty());

@@ -1,26 +1,19 @@
 #include "wavemill/tools/Tools.h"
 
+#include "support/ExpectThrow.h"
+
 #include <gtest/gtest.h>
 
 #include <cstdint>
-#include <stdexcept>
 #include <string>
 #include <vector>
 
 using namespace Corvane::Wavemill;
+using Corvane::Wavemill::Testing::thrown;
 
 namespace {
 
 using Pieces = std::vector<std::string>;
-
-template <class Function> std::string invalidArgumentText(Function function) {
-  try {
-    function();
-  } catch (const std::invalid_argument &e) {
-    return e.what();
-  }
-  return "no exception";
-}
 
 } // namespace
 
@@ -35,15 +28,14 @@ TEST(ToolsTest, SplitKeepsLeadingAndInnerEmptyPiecesButNoTrailingOne) {
   EXPECT_EQ(Tools::splitTrim("\"x\" ;\t y", ";", " \t\""), (Pieces{"x", "y"}));
 }
 
-TEST(ToolsTest, TrimRemovesMembersOfTheSetOnlyAtTheChosenEnds) {
+TEST(ToolsTest, TrimAndReplaceWorkOnlyWhereTheyShould) {
+  // Trimming removes members of the set only at the chosen ends.
   EXPECT_EQ(Tools::trim("   ", ' '), "");
   EXPECT_EQ(Tools::trim(" a ", ""), " a ");
   EXPECT_EQ(Tools::trim("xyaxby", "xy"), "axb");
   EXPECT_EQ(Tools::trimStart("--a--", '-'), "a--");
   EXPECT_EQ(Tools::trimEnd("--a--", "-"), "--a");
-}
-
-TEST(ToolsTest, ReplaceSubstitutesEveryMatchLeftToRightWithoutRescanning) {
+  // Replacing goes left to right without rescanning what it put in.
   EXPECT_EQ(Tools::replace("aaa", "aa", "b"), "ba");
   EXPECT_EQ(Tools::replace("abc", "b", "bb"), "abbc");
   EXPECT_EQ(Tools::replace("aXbX", "X", ""), "ab");
@@ -71,13 +63,12 @@ TEST(ToolsTest, CaseQuotingJoiningAndFilteringWorkOnBytes) {
 }
 
 TEST(ToolsTest, PadLeftClipKeepsTheRightHandEndAtExactlyTheLength) {
-  std::string digits = "12345";
+  std::string digits = "12345", one = "7";
   EXPECT_EQ(Tools::padLeftClip(digits, 3), "345");
   EXPECT_EQ(digits, "12345");
-  std::string one = "7";
   EXPECT_EQ(Tools::padLeftClip(one, 3), "007");
   EXPECT_EQ(Tools::padLeftClip(one, 0), "");
-  EXPECT_EQ(invalidArgumentText([&] { Tools::padLeftClip(one, UINT64_MAX); }), "length");
+  EXPECT_EQ(thrown([&] { Tools::padLeftClip(one, UINT64_MAX); }), "invalid_argument: length");
 }
 
 TEST(ToolsTest, BitStringsConvertOnlyZerosAndOnes) {
@@ -87,22 +78,19 @@ TEST(ToolsTest, BitStringsConvertOnlyZerosAndOnes) {
   EXPECT_EQ(Tools::uint32ToOneZeroString(5, 4), "0101");
   EXPECT_EQ(Tools::uint32ToOneZeroString(0x80000005U, 40), "10000000000000000000000000000101");
   EXPECT_EQ(Tools::uint32ToOneZeroString(5, 0), "");
-  const std::vector<unsigned char> bytes{0, 1, 2, 1};
-  EXPECT_EQ(Tools::bitsToOneZeroString(bytes), "011");
+  EXPECT_EQ(Tools::bitsToOneZeroString(std::vector<unsigned char>{0, 1, 2, 1}), "011");
   EXPECT_EQ(Tools::oneZeroStringToBits("101"), (std::vector<unsigned char>{1, 0, 1}));
-  EXPECT_EQ(invalidArgumentText([] { Tools::oneZeroStringToBits("10 1"); }), "input");
+  EXPECT_EQ(thrown([] { Tools::oneZeroStringToBits("10 1"); }), "invalid_argument: input");
 }
 
-TEST(ToolsTest, EnumIndexToTextClampsTheIndexAndTakesTheFirstWord) {
+TEST(ToolsTest, EnumerationItemsGoByClampedIndexFirstWordAndWholeItemOrListTail) {
   EXPECT_EQ(Tools::enumIndexToText("A, B", 5), "B");
   EXPECT_EQ(Tools::enumIndexToText("A, B", -1), "A");
   EXPECT_EQ(Tools::enumIndexToText("Alpha Beta, Gamma", 0), "Alpha");
   EXPECT_EQ(Tools::enumIndexToText("A,, B", 1), "B");
   EXPECT_EQ(Tools::enumIndexToText("", 3), "");
   EXPECT_EQ(Tools::enumIndexToText(std::string(300, 'x'), 0).size(), 255U);
-}
 
-TEST(ToolsTest, TextToEnumIndexAcceptsWholeItemsAndAnyTailOfTheList) {
   EXPECT_EQ(Tools::textToEnumIndex("Alpha, Beta", "Gamma"), -1);
   EXPECT_EQ(Tools::textToEnumIndex("Alpha, Beta", "Alpha"), 0);
   EXPECT_EQ(Tools::textToEnumIndex("Alpha, Beta", "Beta"), 1);

@@ -1,13 +1,14 @@
 #include "wavemill/tools/Tools.h"
 
+#include "support/ExpectThrow.h"
+#include "support/TempDir.h"
+
 #include <gtest/gtest.h>
 
 #include <cfenv>
 #include <cmath>
 #include <complex>
 #include <cstdint>
-#include <filesystem>
-#include <fstream>
 #include <limits>
 #include <memory>
 #include <stdexcept>
@@ -15,7 +16,8 @@
 #include <vector>
 
 using namespace Corvane::Wavemill;
-namespace fs = std::filesystem;
+using Corvane::Wavemill::Testing::TempDir;
+using Corvane::Wavemill::Testing::thrown;
 
 namespace {
 
@@ -30,14 +32,6 @@ std::vector<std::int16_t> words(const Bytes &bytes) {
   for (std::size_t i = 0; i + 1 < bytes.size(); i += 2)
     result.push_back(static_cast<std::int16_t>(static_cast<std::uint16_t>(bytes[i] << 8 | bytes[i + 1])));
   return result;
-}
-
-std::string writeMarkerFile(const std::string &name, const Bytes &bytes) {
-  const fs::path path =
-      fs::temp_directory_path() / ("wavemill-" + name + "-" + std::to_string(Tools::getCurrentProcessId()));
-  std::ofstream(path, std::ios::binary)
-      .write(reinterpret_cast<const char *>(bytes.data()), static_cast<std::streamsize>(bytes.size()));
-  return path.string();
 }
 
 } // namespace
@@ -57,15 +51,10 @@ TEST(ToolsTest, MirrorSpectrumNegatesQOnlyAndSaturatesTheMostNegativeValue) {
   Tools::mirrorSpectrum(bytes);
   EXPECT_EQ(words(bytes), (std::vector<std::int16_t>{0x1234, -1, -32768, 32767, 32767, -32767, 0, 0}));
 
-  Bytes empty;
-  EXPECT_NO_THROW(Tools::mirrorSpectrum(empty));
-  Bytes six(6, 0x01);
-  try {
-    Tools::mirrorSpectrum(six);
-    ADD_FAILURE() << "no exception";
-  } catch (const std::invalid_argument &e) {
-    EXPECT_STREQ(e.what(), "mirrorSpectrum(waveform): Incorrect waveform length.");
-  }
+  Bytes empty, six(6, 0x01);
+  EXPECT_EQ(thrown([&] { Tools::mirrorSpectrum(empty); }), "nothing");
+  EXPECT_EQ(thrown([&] { Tools::mirrorSpectrum(six); }),
+            "invalid_argument: mirrorSpectrum(waveform): Incorrect waveform length.");
   EXPECT_EQ(six, Bytes(6, 0x01));
 }
 
@@ -74,12 +63,7 @@ TEST(ToolsTest, ParseDoubleArrayDropsForeignCharactersBeforeSplitting) {
   EXPECT_EQ(Tools::parseDoubleArray("1e3,,-2.5E-1,", ","), (std::vector<double>{1000, -0.25}));
   EXPECT_EQ(Tools::parseDoubleArray("4\t5", "\t"), (std::vector<double>{4, 5}));
   EXPECT_TRUE(Tools::parseDoubleArray("abc", ",").empty());
-  try {
-    Tools::parseDoubleArray("", ",");
-    ADD_FAILURE() << "no exception";
-  } catch (const std::invalid_argument &e) {
-    EXPECT_STREQ(e.what(), "input");
-  }
+  EXPECT_EQ(thrown([] { Tools::parseDoubleArray("", ","); }), "invalid_argument: input");
   EXPECT_THROW(Tools::parseDoubleArray("1,-", ","), std::invalid_argument); // a lone sign reaches stod
 }
 
@@ -107,25 +91,23 @@ TEST(ToolsTest, ConvertToWaveformRoundsInTheCurrentModeAndClampsToSixteenBits) {
   EXPECT_EQ(words(bytes), (std::vector<std::int16_t>{32767, -32767, 32767, -32768, 0, 16384, 32767, -32768, 0, 32767,
                                                      -32768, 16384}));
 
-  const Samples halves(6, {2.5, -3.5});
-  const auto convertHalves = [&halves](int mode) {
-    Bytes out(4 * halves.size());
+  // To nearest, halves go to even, not away from zero.
+  const struct {
+    int mode;
+    std::int16_t i, q;
+  } modes[] = {{FE_TONEAREST, 2, -4}, {FE_UPWARD, 3, -3}, {FE_DOWNWARD, 2, -4}, {FE_TOWARDZERO, 2, -3}};
+  for (const auto &row : modes) {
+    SCOPED_TRACE(row.mode);
+    Bytes out(4 * 6);
     const int previous = std::fegetround();
-    std::fesetround(mode);
-    Tools::convertToWaveform(halves, out, 1.0 / 32767);
+    std::fesetround(row.mode);
+    Tools::convertToWaveform(Samples(6, {2.5, -3.5}), out, 1.0 / 32767);
     std::fesetround(previous);
-    return words(out);
-  };
-  const auto repeated = [](std::int16_t i, std::int16_t q) {
-    std::vector<std::int16_t> result;
+    std::vector<std::int16_t> expected;
     for (int n = 0; n < 6; ++n)
-      result.insert(result.end(), {i, q});
-    return result;
-  };
-  EXPECT_EQ(convertHalves(FE_TONEAREST), repeated(2, -4)); // halves to even, not away from zero
-  EXPECT_EQ(convertHalves(FE_UPWARD), repeated(3, -3));
-  EXPECT_EQ(convertHalves(FE_DOWNWARD), repeated(2, -4));
-  EXPECT_EQ(convertHalves(FE_TOWARDZERO), repeated(2, -3));
+      expected.insert(expected.end(), {row.i, row.q});
+    EXPECT_EQ(words(out), expected);
+  }
 
   Bytes tooShort(7, 0xaa); // room for one whole sample; the rest stays as it was
   Tools::convertToWaveform(Samples{{0, 0}, {0, 0}}, tooShort, 1.0);
@@ -175,7 +157,9 @@ TEST(ToolsTest, SetBitsWritesTheLowestBitOfTheValueIntoTheBytesThatExist) {
 }
 
 TEST(ToolsTest, GetPulseGivesStartAndEndOfEachRunOfTheBit) {
-  const std::string small = writeMarkerFile("small", Bytes{0, 2, 3, 0, 1, 2, 2, 2});
+  const TempDir dir;
+  const std::string small = dir.path("small"), across = dir.path("large");
+  Tools::writeFile(small, Bytes{0, 2, 3, 0, 1, 2, 2, 2});
   EXPECT_EQ(Tools::getPulse(small, 100, 1), (std::vector<std::int64_t>{1, 2, 5, 7}));
   EXPECT_EQ(Tools::getPulse(small, 6, 1), (std::vector<std::int64_t>{1, 2, 5, 5}));
   EXPECT_EQ(Tools::getPulse(small, 100, 0), (std::vector<std::int64_t>{2, 2, 4, 4}));
@@ -185,8 +169,6 @@ TEST(ToolsTest, GetPulseGivesStartAndEndOfEachRunOfTheBit) {
   Bytes large(0x200000 + 10, 0); // a run across the boundary of two read blocks
   for (std::size_t i = 0x1ffffe; i <= 0x200002; ++i)
     large[i] = 0x10;
-  const std::string across = writeMarkerFile("large", large);
+  Tools::writeFile(across, large);
   EXPECT_EQ(Tools::getPulse(across, 1 << 30, 4), (std::vector<std::int64_t>{0x1ffffe, 0x200002}));
-  fs::remove(small);
-  fs::remove(across);
 }
