@@ -4,33 +4,40 @@
 #include "wavemill/waveform/DataWriter.h"
 #include "wavemill/waveform/DynamicBuffer.h"
 
-#include <algorithm>
-#include <cstring>
+#include <gtest/gtest.h>
+
+#include <cstdint>
+#include <string>
 #include <vector>
 
 namespace Corvane::Wavemill::Testing {
 
+/// The bytes spelled in hex; blanks only separate fields.
+inline std::vector<unsigned char> hex(const char *text) {
+  std::vector<unsigned char> out;
+  for (; *text != '\0'; ++text) {
+    if (*text != ' ') {
+      out.push_back(static_cast<unsigned char>(std::stoi(std::string(text, 2), nullptr, 16)));
+      ++text;
+    }
+  }
+  return out;
+}
+
+struct HeldBytes {
+  std::vector<unsigned char> held;
+};
+
 /// Reads a copy of `bytes` (a heap block of their exact length, so the
 /// sanitizer sees reads past them) and counts items as fread does.
-class ItemReader : public DataReader {
+class ItemReader : HeldBytes, public Buffer_DataReader {
 public:
-  explicit ItemReader(const std::vector<unsigned char> &bytes) : bytes_(bytes) {}
+  explicit ItemReader(const std::vector<unsigned char> &bytes)
+      : HeldBytes{bytes}, Buffer_DataReader(held.data(), static_cast<int>(held.size())) {}
   int read(void *dest, int size, int count) override {
-    const std::size_t want = static_cast<std::size_t>(size) * static_cast<std::size_t>(count);
-    const std::size_t take = std::min(want, bytes_.size() - pos_);
-    if (take > 0) {
-      std::memcpy(dest, bytes_.data() + pos_, take);
-    }
-    pos_ += take;
-    return take == want && want > 0 ? count : 0;
+    const int n = Buffer_DataReader::read(dest, size, count);
+    return n > 0 && n == static_cast<int64_t>(size) * count ? count : 0;
   }
-  int64_t size() override { return static_cast<int64_t>(bytes_.size()); }
-  void reset() override { pos_ = 0; }
-  bool isValid() override { return true; }
-
-private:
-  std::vector<unsigned char> bytes_;
-  std::size_t pos_ = 0;
 };
 
 /// Collects what is written in 1024-byte blocks, counting items as fwrite
@@ -55,5 +62,12 @@ public:
 private:
   DynamicBuffer store_{1024};
 };
+
+/// What `header` writes, the write expected to succeed.
+template <typename Header> std::vector<unsigned char> written(Header &header) {
+  ItemWriter writer;
+  EXPECT_TRUE(header.write(&writer));
+  return writer.bytes();
+}
 
 } // namespace Corvane::Wavemill::Testing

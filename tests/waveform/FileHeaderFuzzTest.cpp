@@ -10,8 +10,7 @@
 #include <vector>
 
 using namespace Corvane::Wavemill;
-using Corvane::Wavemill::Testing::ItemReader;
-using Corvane::Wavemill::Testing::ItemWriter;
+using namespace Corvane::Wavemill::Testing;
 using Bytes = std::vector<unsigned char>;
 
 namespace {
@@ -23,9 +22,7 @@ Bytes realHeader() {
   header.writeBuffer(FileHeader::Tag39, "reserved", 8);
   header.writeBuffer(FileHeader::Tag44, "name", 4);
   header.writeBuffer(FileHeader::Tag45, "comment", 7);
-  ItemWriter writer;
-  EXPECT_TRUE(header.write(&writer));
-  return writer.bytes();
+  return written(header);
 }
 
 // Reads `input` and checks what any reader must give: a read that succeeds
@@ -36,23 +33,17 @@ void readAndCheck(const Bytes &input) {
   FlexibleArbFileHeader header;
   ItemReader reader(input);
   if (header.read(&reader)) {
-    ItemWriter writer;
-    ASSERT_TRUE(header.write(&writer));
-    const Bytes first = writer.bytes();
+    const Bytes first = written(header);
     EXPECT_EQ(static_cast<int>(first.size()), header.getCurrentHeaderSize());
     FlexibleArbFileHeader again;
     ItemReader rereader(first);
     ASSERT_TRUE(again.read(&rereader));
-    ItemWriter rewriter;
-    ASSERT_TRUE(again.write(&rewriter));
-    EXPECT_EQ(rewriter.bytes(), first);
+    EXPECT_EQ(written(again), first);
   }
   char out[300];
-  for (int tag = 0; tag < FileHeader::TagCount; ++tag) {
-    EXPECT_EQ(header.readBuffer(out, 300, static_cast<FileHeader::Tag>(tag)),
-              header.hasTag(static_cast<FileHeader::Tag>(tag))
-                  ? header.getTagLengthActual(static_cast<FileHeader::Tag>(tag))
-                  : 0);
+  for (int i = 0; i < FileHeader::TagCount; ++i) {
+    const auto tag = static_cast<FileHeader::Tag>(i);
+    EXPECT_EQ(header.readBuffer(out, 300, tag), header.hasTag(tag) ? header.getTagLengthActual(tag) : 0);
   }
   // The decoders over the same bytes, from the start and from a block.
   Bytes copy = input;

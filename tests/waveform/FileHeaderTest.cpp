@@ -10,23 +10,11 @@
 #include <vector>
 
 using namespace Corvane::Wavemill;
-using Corvane::Wavemill::Testing::ItemReader;
-using Corvane::Wavemill::Testing::ItemWriter;
+using namespace Corvane::Wavemill::Testing;
 using Bytes = std::vector<unsigned char>;
 
 namespace {
 
-// The bytes spelled in hex; blanks only separate fields.
-Bytes hex(const char *text) {
-  Bytes out;
-  for (; *text != '\0'; ++text) {
-    if (*text != ' ') {
-      out.push_back(static_cast<unsigned char>(std::stoi(std::string(text, 2), nullptr, 16)));
-      ++text;
-    }
-  }
-  return out;
-}
 Bytes operator+(Bytes a, const Bytes &b) {
   a.insert(a.end(), b.begin(), b.end());
   return a;
@@ -52,12 +40,6 @@ Bytes flexibleDefaults() {
   return flexibleBase() + flexibleBlock1() + flexibleBlock3() + flexibleBlock10() + hex("0000");
 }
 
-Bytes serialize(FileHeader &header) {
-  ItemWriter writer;
-  EXPECT_TRUE(header.write(&writer));
-  return writer.bytes();
-}
-
 Bytes tagBytes(const FileHeader &header, FileHeader::Tag tag) {
   char out[256];
   const int n = header.readBuffer(out, 256, tag);
@@ -78,7 +60,7 @@ TEST(FileHeaderTest, NewHeadersSerializeTheirDefaultsByteForByteAndReadBack) {
   for (const auto &row : rows) {
     SCOPED_TRACE(row.name);
     const auto header = row.make();
-    EXPECT_EQ(serialize(*header), row.expected);
+    EXPECT_EQ(written(*header), row.expected);
     EXPECT_EQ(header->getCurrentHeaderSize(), static_cast<int>(row.expected.size()));
 
     ItemWriter unchanged;
@@ -89,7 +71,7 @@ TEST(FileHeaderTest, NewHeadersSerializeTheirDefaultsByteForByteAndReadBack) {
     const auto back = row.make();
     ItemReader reader(row.expected);
     EXPECT_TRUE(back->read(&reader));
-    EXPECT_EQ(serialize(*back), row.expected);
+    EXPECT_EQ(written(*back), row.expected);
   }
 }
 
@@ -121,7 +103,7 @@ TEST(FileHeaderTest, WriteBufferClipsToTheFieldAndVariableFieldsSetTheirBlock) {
       header.writeBuffer(FileHeader::Tag44, text.data(), 0);
     }
     EXPECT_EQ(header.getCurrentHeaderSize(), row.headerSize);
-    EXPECT_EQ(static_cast<int>(serialize(header).size()), row.headerSize);
+    EXPECT_EQ(static_cast<int>(written(header).size()), row.headerSize);
   }
 
   FlexibleArbFileHeader header;
@@ -130,7 +112,7 @@ TEST(FileHeaderTest, WriteBufferClipsToTheFieldAndVariableFieldsSetTheirBlock) {
   header.writeBuffer(FileHeader::Tag44, "xyz", 3);
   EXPECT_EQ(header.getTagLengthActual(FileHeader::Tag44), 3);
   EXPECT_EQ(tagBytes(header, FileHeader::Tag44), (Bytes{'x', 'y', 'z'}));
-  const Bytes bytes = serialize(header);
+  const Bytes bytes = written(header);
   EXPECT_EQ(Bytes(bytes.end() - 13, bytes.end()), hex("0A 09 FF BF800000 00 78797A 0000")); // "xyz"
 }
 
@@ -182,10 +164,10 @@ TEST(FileHeaderTest, CopyKeepsItsOwnIdAndTakesTheFieldsBothLayoutsShare) {
   EXPECT_EQ(tagBytes(*flexible, FileHeader::Tag6), (Bytes{0xC0, 0x04, 0, 0, 0, 0, 0, 0}));
   EXPECT_EQ(tagBytes(*flexible, FileHeader::TagMagic), (Bytes{0x87, 0x86, 0x85, 0x84}));
   EXPECT_EQ(tagBytes(*flexible, FileHeader::TagHeaderId), (Bytes{0xFF, 0xFF, 0x00, 0x01}));
-  EXPECT_EQ(serialize(*flexible).size(), 173u);
+  EXPECT_EQ(written(*flexible).size(), 173u);
 
   const std::unique_ptr<FileHeader> same(ArbFileHeader::copy(arb));
   ASSERT_NE(same, nullptr);
-  EXPECT_EQ(serialize(*same), serialize(arb));
+  EXPECT_EQ(written(*same), written(arb));
   EXPECT_EQ(tagBytes(*same, FileHeader::Tag14), Bytes{0x07});
 }

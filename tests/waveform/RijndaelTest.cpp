@@ -123,49 +123,38 @@ TEST(RijndaelTest, ResultCodesAndLengthsFollowTheTable) {
   unsigned char in[64] = {};
   unsigned char out[80] = {};
   EXPECT_EQ(R().blockEncrypt(in, 128, out), -5); // never initialized
+  // A cipher initialized successfully, then again with these arguments; the
+  // result of that init ('i') or of a call: e/d blockEncrypt/blockDecrypt
+  // (length in bits), E/D padEncrypt/padDecrypt (in bytes), n blockEncrypt of
+  // no input.
+  const auto run = [&](R::Mode mode, R::Direction dir, R::KeyLength keyLength, bool withKey, char op, int length) {
+    R aes;
+    EXPECT_EQ(aes.init(R::ECB, R::Encrypt, key.data(), R::Key16Bytes), 0);
+    const int init = aes.init(mode, dir, withKey ? key.data() : nullptr, keyLength);
+    return op == 'i'   ? init
+           : op == 'e' ? aes.blockEncrypt(in, length, out)
+           : op == 'n' ? aes.blockEncrypt(nullptr, length, out)
+           : op == 'd' ? aes.blockDecrypt(in, length, out)
+           : op == 'E' ? aes.padEncrypt(in, length, out)
+                       : aes.padDecrypt(in, length, out);
+  };
   const auto E = R::Encrypt, D = R::Decrypt;
   const auto K16 = R::Key16Bytes;
-  // op: 'i' the result of init; e/d blockEncrypt/blockDecrypt (bits), E/D padEncrypt/padDecrypt (bytes),
-  // 'n' blockEncrypt of no input. Every row first initializes a cipher successfully.
-  const struct {
-    const char *name;
-    R::Mode mode;
-    R::Direction dir;
-    R::KeyLength keyLength;
-    bool withKey;
-    char op;
-    int length;
-    int expected;
-  } rows[] = {
-      {"mode 3", R::Mode(3), E, K16, true, 'i', 0, -1},
-      {"direction 2", R::ECB, R::Direction(2), K16, true, 'i', 0, -2},
-      {"key length 3", R::ECB, E, R::KeyLength(3), true, 'i', 0, -3},
-      {"null key", R::CBC, D, R::Key32Bytes, false, 'i', 0, -4},
-      {"failed init", R::ECB, E, K16, false, 'E', 16, -5},
-      {"encrypt on Decrypt", R::ECB, D, K16, true, 'e', 128, -6},
-      {"decrypt on Encrypt", R::CBC, E, K16, true, 'D', 16, -6},
-      {"padded length 20", R::CBC, D, K16, true, 'D', 20, -7},
-      {"padded CFB1", R::CFB1, E, K16, true, 'E', 16, -1},
-      {"null input", R::ECB, E, K16, true, 'n', 128, 0},
-      {"length 0", R::ECB, D, K16, true, 'd', 0, 0},
-      {"negative length", R::ECB, E, K16, true, 'E', -16, 0},
-      {"partial block", R::ECB, E, K16, true, 'e', 255, 128},
-      {"pad 20 bytes", R::ECB, E, K16, true, 'E', 20, 32},
-      {"pad 32 bytes", R::CBC, E, K16, true, 'E', 32, 48},
-  };
-  for (const auto &row : rows) {
-    SCOPED_TRACE(row.name);
-    R aes;
-    ASSERT_EQ(aes.init(R::ECB, E, key.data(), K16), 0);
-    const int init = aes.init(row.mode, row.dir, row.withKey ? key.data() : nullptr, row.keyLength);
-    const int result = row.op == 'i'   ? init
-                       : row.op == 'e' ? aes.blockEncrypt(in, row.length, out)
-                       : row.op == 'n' ? aes.blockEncrypt(nullptr, row.length, out)
-                       : row.op == 'd' ? aes.blockDecrypt(in, row.length, out)
-                       : row.op == 'E' ? aes.padEncrypt(in, row.length, out)
-                                       : aes.padDecrypt(in, row.length, out);
-    EXPECT_EQ(result, row.expected);
-  }
+  EXPECT_EQ(run(R::Mode(3), E, K16, true, 'i', 0), -1);
+  EXPECT_EQ(run(R::ECB, R::Direction(2), K16, true, 'i', 0), -2);
+  EXPECT_EQ(run(R::ECB, E, R::KeyLength(3), true, 'i', 0), -3);
+  EXPECT_EQ(run(R::CBC, D, R::Key32Bytes, false, 'i', 0), -4);
+  EXPECT_EQ(run(R::ECB, E, K16, false, 'E', 16), -5) << "a failed init leaves the cipher unusable";
+  EXPECT_EQ(run(R::ECB, D, K16, true, 'e', 128), -6);
+  EXPECT_EQ(run(R::CBC, E, K16, true, 'D', 16), -6);
+  EXPECT_EQ(run(R::CBC, D, K16, true, 'D', 20), -7) << "padded length not a whole block";
+  EXPECT_EQ(run(R::CFB1, E, K16, true, 'E', 16), -1) << "padding in CFB1";
+  EXPECT_EQ(run(R::ECB, E, K16, true, 'n', 128), 0);
+  EXPECT_EQ(run(R::ECB, D, K16, true, 'd', 0), 0);
+  EXPECT_EQ(run(R::ECB, E, K16, true, 'E', -16), 0);
+  EXPECT_EQ(run(R::ECB, E, K16, true, 'e', 255), 128) << "only whole blocks";
+  EXPECT_EQ(run(R::ECB, E, K16, true, 'E', 20), 32);
+  EXPECT_EQ(run(R::CBC, E, K16, true, 'E', 32), 48) << "a whole block of padding";
 }
 
 TEST(RijndaelTest, PadCountRulesDifferByMode) {

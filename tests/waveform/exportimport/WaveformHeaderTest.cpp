@@ -14,21 +14,10 @@
 
 using namespace Corvane::Wavemill;
 using Corvane::Wavemill::ExportImport::WaveformHeader;
+using Corvane::Wavemill::Testing::hex;
 using Bytes = std::vector<unsigned char>;
 
 namespace {
-
-// The bytes spelled in hex (capitals); blanks only separate fields.
-Bytes hex(const std::string &text) {
-  const auto nibble = [](char c) { return c <= '9' ? c - '0' : c - 'A' + 10; };
-  Bytes out;
-  for (std::size_t i = 0; i + 1 < text.size(); i += text[i] == ' ' ? 1 : 2) {
-    if (text[i] != ' ') {
-      out.push_back(static_cast<unsigned char>(nibble(text[i]) * 16 + nibble(text[i + 1])));
-    }
-  }
-  return out;
-}
 
 // The flag a field needs in order to be written.
 enum Needs { Always, Ext1, Ext2, Text, Block14 };
@@ -73,30 +62,23 @@ const std::vector<Field> &fields() {
   return all;
 }
 
-struct Flags {
-  bool ext1, ext2, text, block14;
-};
-
-WaveformHeader fullRecord(Flags flags) {
+WaveformHeader fullRecord(bool ext1, bool ext2, bool text, bool block14) {
   WaveformHeader h;
   for (const auto &f : fields()) {
     f.set(h);
   }
-  h.hasExtension1 = flags.ext1;
-  h.hasExtension2 = flags.ext2;
-  h.hasTextBlocks = flags.text;
-  h.hasBlock14 = flags.block14;
+  h.hasExtension1 = ext1, h.hasExtension2 = ext2, h.hasTextBlocks = text, h.hasBlock14 = block14;
   return h;
 }
 
 } // namespace
 
 TEST(WaveformHeaderTest, WrittenRecordReadsBackFieldForField) {
-  const Flags rows[] = {
+  const bool rows[][4] = {
       {false, false, false, false}, {false, true, false, false}, {true, false, true, false}, {true, true, true, true}};
   for (const auto &row : rows) {
-    SCOPED_TRACE(::testing::Message() << row.ext1 << row.ext2 << row.text << row.block14);
-    WaveformHeader written = fullRecord(row);
+    SCOPED_TRACE(::testing::Message() << row[0] << row[1] << row[2] << row[3]);
+    WaveformHeader written = fullRecord(row[0], row[1], row[2], row[3]);
     Bytes bytes = written.getHeaderBytes();
     EXPECT_EQ(static_cast<int>(bytes.size()), written.getHeaderLength());
     WaveformHeader read;
@@ -110,8 +92,8 @@ TEST(WaveformHeaderTest, WrittenRecordReadsBackFieldForField) {
     }
     EXPECT_EQ(read.hasExtension1, written.hasExtension1) << "the second extension brings the first";
     EXPECT_EQ(read.hasExtension2, written.hasExtension2);
-    EXPECT_EQ(read.hasTextBlocks, row.text);
-    EXPECT_EQ(read.hasBlock14, row.block14);
+    EXPECT_EQ(read.hasTextBlocks, written.hasTextBlocks);
+    EXPECT_EQ(read.hasBlock14, written.hasBlock14);
   }
 }
 
@@ -133,7 +115,7 @@ TEST(WaveformHeaderTest, DefaultRecordSerializesToTheTabledBytes) {
 }
 
 TEST(WaveformHeaderTest, FlexibleHeaderReadsTheSharedFieldsInTheirPlaces) {
-  WaveformHeader h = fullRecord({true, true, true, true});
+  WaveformHeader h = fullRecord(true, true, true, true);
   Testing::ItemReader reader(h.getHeaderBytes());
   FlexibleArbFileHeader flexible;
   ASSERT_TRUE(flexible.read(&reader)) << "same header id, rising block ids";
@@ -185,7 +167,7 @@ TEST(WaveformHeaderTest, ReadingKeepsTheFormatsRulesForTextsExtensionsAndUnknown
 }
 
 TEST(WaveformHeaderTest, DamagedBytesNeverReadPastThemAndGiveStableRecords) {
-  WaveformHeader full = fullRecord({true, true, true, true});
+  WaveformHeader full = fullRecord(true, true, true, true);
   const Bytes good = full.getHeaderBytes();
   const WaveformHeader fresh;
   std::vector<Bytes> inputs;
