@@ -2,7 +2,6 @@
 
 #include "support/ExpectThrow.h"
 #include "support/TestInstrument.h"
-#include "wavemill/simulator/SimulatedInstrument.h"
 #include "wavemill/tools/Exceptions.h"
 #include "wavemill/tools/Tools.h"
 
@@ -12,8 +11,7 @@
 #include <memory>
 
 using namespace Corvane::Wavemill;
-using Testing::TestInstrument;
-using Testing::thrownMessage;
+using Testing::thrown;
 using Strings = std::vector<std::string>;
 
 TEST(HardwareResourceTest, HasLooksAtTheFirstOccurrenceAndTheIndexOfTheOptionLength) {
@@ -59,10 +57,10 @@ TEST(HardwareResourceTest, ChecksNameTheMissingOptionsJoinedForTheModel) {
       {[&] { return resource.checkAny("X1,Y2", false); }, "One of the options(X1/Y2) is required for SG200."},
       {[&] { return HardwareResource::join(none) + "|" + HardwareResource::join(two); }, "|AB"},
       {[&] { return HardwareResource::join(five); }, "AB, C, Dand E"}, // no separator after the first part
-      {[&] { return thrownMessage<InstrumentException>([&] { resource.checkAll("X1", true); }); },
-       "Option X1 is required for SG200."},
-      {[&] { return thrownMessage<InstrumentException>([&] { resource.checkAny("X1,Y2", true); }); },
-       "One of the options(X1/Y2) is required for SG200."},
+      {[&] { return thrown([&] { resource.checkAll("X1", true); }); },
+       "InstrumentException: Option X1 is required for SG200."},
+      {[&] { return thrown([&] { resource.checkAny("X1,Y2", true); }); },
+       "InstrumentException: One of the options(X1/Y2) is required for SG200."},
   };
   for (const auto &row : rows) {
     SCOPED_TRACE(row.expected);
@@ -71,8 +69,9 @@ TEST(HardwareResourceTest, ChecksNameTheMissingOptionsJoinedForTheModel) {
 }
 
 TEST(HardwareResourceTest, UpdateConnectionTakesACompleteIdentityOnlyAndKeepsItForTheAddress) {
-  SimulatedInstrument simulator;
-  auto instrument = std::make_shared<TestInstrument>(simulator.getAddress(), 500);
+  Testing::SimulatedBench bench({}, 500);
+  auto &simulator = bench.simulator;
+  const auto &instrument = bench.instrument;
   HardwareResource resource;
 
   simulator.setIdentity("Corvane, SG200 ,100123,1.4.2,extra");

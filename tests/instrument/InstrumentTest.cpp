@@ -1,9 +1,8 @@
 #include "wavemill/instrument/Instrument.h"
 
+#include "support/ExpectThrow.h"
 #include "support/TestInstrument.h"
 #include "wavemill/models/DoubleSetting.h"
-#include "wavemill/simulator/SimulatedInstrument.h"
-#include "wavemill/tools/Exceptions.h"
 
 #include <gtest/gtest.h>
 
@@ -12,55 +11,35 @@
 #include <functional>
 #include <limits>
 #include <memory>
-#include <stdexcept>
 
 using namespace Corvane::Wavemill;
+using Testing::pattern;
 using Testing::TestInstrument;
+using Testing::thrown;
 using Strings = std::vector<std::string>;
 
 namespace {
 
-// The type and the text of what `action` throws, in one comparable string.
-std::string thrown(const std::function<void()> &action) {
-  try {
-    action();
-  } catch (const ArgumentOutOfRangeException &e) {
-    return "out_of_range: " + e.getMessage();
-  } catch (const std::invalid_argument &e) {
-    return std::string("invalid_argument: ") + e.what();
-  } catch (const std::runtime_error &e) {
-    return std::string("runtime_error: ") + e.what();
-  }
-  return "nothing";
-}
-
-std::vector<unsigned char> pattern(std::size_t size) {
-  std::vector<unsigned char> bytes(size);
-  for (std::size_t i = 0; i < size; ++i)
-    bytes[i] = static_cast<unsigned char>(i * 7); // zero bytes, '\n' and '#' included
-  return bytes;
-}
+class InstrumentTest : public ::testing::Test, protected Testing::SimulatedBench {};
 
 } // namespace
 
-TEST(InstrumentTest, SendWritesOneLineAndReadsTheAnswerOfAQueryOnly) {
-  SimulatedInstrument simulator;
-  TestInstrument instrument(simulator.getAddress(), 2000);
+TEST_F(InstrumentTest, SendWritesOneLineAndReadsTheAnswerOfAQueryOnly) {
   const std::string previous = std::setlocale(LC_ALL, nullptr);
   std::setlocale(LC_ALL, "de_DE.utf8"); // printf writes 1,5 here, where the locale is installed
   const struct {
     std::function<void()> send;
     const char *onWire;
   } rows[] = {
-      {[&] { instrument.send("FREQ 1E9"); }, "FREQ 1E9"},
-      {[&] { instrument.send("*IDN?"); }, "*IDN?"},
-      {[&] { instrument.send("[:SOUR1]:FREQ? MAX"); }, ":SOUR1:FREQ? MAX"},
-      {[&] { instrument.send("[SOUR1:]FREQ[:CW] 2E9"); }, "SOUR1:FREQ:CW 2E9"},
-      {[&] { instrument.send("MMEM:NAME 'a[1]'"); }, "MMEM:NAME 'a[1]'"},
-      {[&] { instrument.send("[SOUR1:]LIST:NAME 'x[2]'"); }, "SOUR1:LIST:NAME 'x[2]'"},
-      {[&] { instrument.sendNumber("FREQ ", 1.5); }, "FREQ 1.500000"},
-      {[&] { instrument.sendNumber("FREQ", 1e9); }, "FREQ 1000000000.000000"},
-      {[&] { instrument.sendNumber("FREQ", -4e-7); }, "FREQ -0.000000"},
+      {[&] { instrument->send("FREQ 1E9"); }, "FREQ 1E9"},
+      {[&] { instrument->send("*IDN?"); }, "*IDN?"},
+      {[&] { instrument->send("[:SOUR1]:FREQ? MAX"); }, ":SOUR1:FREQ? MAX"},
+      {[&] { instrument->send("[SOUR1:]FREQ[:CW] 2E9"); }, "SOUR1:FREQ:CW 2E9"},
+      {[&] { instrument->send("MMEM:NAME 'a[1]'"); }, "MMEM:NAME 'a[1]'"},
+      {[&] { instrument->send("[SOUR1:]LIST:NAME 'x[2]'"); }, "SOUR1:LIST:NAME 'x[2]'"},
+      {[&] { instrument->sendNumber("FREQ ", 1.5); }, "FREQ 1.500000"},
+      {[&] { instrument->sendNumber("FREQ", 1e9); }, "FREQ 1000000000.000000"},
+      {[&] { instrument->sendNumber("FREQ", -4e-7); }, "FREQ -0.000000"},
   };
   for (const auto &row : rows) {
     SCOPED_TRACE(row.onWire);
@@ -70,32 +49,31 @@ TEST(InstrumentTest, SendWritesOneLineAndReadsTheAnswerOfAQueryOnly) {
     // A read after a command would wait for the whole time-out.
     EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::milliseconds(1000));
     // An answer left in the input would be read here instead of "1".
-    EXPECT_EQ(instrument.query("*OPC?", -1), "1");
+    EXPECT_EQ(instrument->query("*OPC?", -1), "1");
     EXPECT_EQ(simulator.getCommands(), (Strings{row.onWire, "*OPC?"}));
   }
   std::setlocale(LC_ALL, previous.c_str());
 }
 
-TEST(InstrumentTest, ArgumentFaultsThrowTheirTextAndSendNothing) {
-  SimulatedInstrument simulator;
-  TestInstrument instrument(simulator.getAddress(), 2000);
+TEST_F(InstrumentTest, ArgumentFaultsThrowTheirTextAndSendNothing) {
   TestInstrument idle("", 2000);
   idle.setThrowOnError(false);
   std::vector<unsigned char> data(4);
+  auto &i = *instrument;
   const struct {
     std::function<void()> action;
     const char *expected;
   } rows[] = {
-      {[&] { instrument.send(""); }, "invalid_argument: command"},
-      {[&] { instrument.query("", -1); }, "invalid_argument: command"},
-      {[&] { instrument.query("*IDN?", -2); }, "invalid_argument: timeoutInMS"},
-      {[&] { instrument.queryBlock("", 0); }, "invalid_argument: command"},
-      {[&] { instrument.queryBlock("X?", -2); }, "out_of_range: timeoutInMS"},
-      {[&] { instrument.queryArray(""); }, "invalid_argument: query"},
-      {[&] { instrument.sendBlock("", data, 0); }, "invalid_argument: command"},
-      {[&] { instrument.sendIfDifferent("FREQ"); }, "invalid_argument: command"},
-      {[&] { instrument.sendIfDifferent("FREQ 1 2"); }, "invalid_argument: command"},
-      {[&] { instrument.sendIfDifferent("FREQ  1"); }, "invalid_argument: command"},
+      {[&] { i.send(""); }, "invalid_argument: command"},
+      {[&] { i.query("", -1); }, "invalid_argument: command"},
+      {[&] { i.query("*IDN?", -2); }, "invalid_argument: timeoutInMS"},
+      {[&] { i.queryBlock("", 0); }, "invalid_argument: command"},
+      {[&] { i.queryBlock("X?", -2); }, "ArgumentOutOfRangeException: timeoutInMS"},
+      {[&] { i.queryArray(""); }, "invalid_argument: query"},
+      {[&] { i.sendBlock("", data, 0); }, "invalid_argument: command"},
+      {[&] { i.sendIfDifferent("FREQ"); }, "invalid_argument: command"},
+      {[&] { i.sendIfDifferent("FREQ 1 2"); }, "invalid_argument: command"},
+      {[&] { i.sendIfDifferent("FREQ  1"); }, "invalid_argument: command"},
       {[&] { idle.query("*IDN?", -1); }, "runtime_error: The instrument address is empty."},
   };
   for (const auto &row : rows) {
@@ -104,12 +82,11 @@ TEST(InstrumentTest, ArgumentFaultsThrowTheirTextAndSendNothing) {
   }
   EXPECT_TRUE(simulator.getCommands().empty());
   // 0 is a valid time-out for query: the connection opens with the default.
-  EXPECT_EQ(instrument.query("*IDN?", 0), SimulatorOptions().identity);
+  EXPECT_EQ(instrument->query("*IDN?", 0), SimulatorOptions().identity);
 }
 
-TEST(InstrumentTest, SendIfDifferentComparesNumbersByValueAndTextsByShortForm) {
-  SimulatedInstrument simulator;
-  TestInstrument instrument(simulator.getAddress(), 500);
+TEST_F(InstrumentTest, SendIfDifferentComparesNumbersByValueAndTextsByShortForm) {
+  TestInstrument quick(address(), 500); // an unknown header goes unanswered for the time-out
   const struct {
     const char *present;
     const char *command;
@@ -125,29 +102,27 @@ TEST(InstrumentTest, SendIfDifferentComparesNumbersByValueAndTextsByShortForm) {
   };
   for (const auto &row : rows) {
     SCOPED_TRACE(row.command);
-    instrument.send(row.present);
-    instrument.query("*OPC?", -1); // the simulator has taken the value in
+    quick.send(row.present);
+    quick.query("*OPC?", -1); // the simulator has taken the value in
     simulator.clearCommands();
     const std::string command = row.command;
-    const std::string query = command.substr(0, command.find(' ')) + "?";
     std::string outcome;
-    if (const std::string error = thrown([&] { outcome = instrument.sendIfDifferent(command) ? "sent" : "kept"; });
+    if (const std::string error = thrown([&] { outcome = quick.sendIfDifferent(command) ? "sent" : "kept"; });
         error != "nothing")
       outcome = error;
     EXPECT_EQ(outcome, row.outcome);
     if (outcome == "sent" || outcome == "kept") {
       // A command gets no answer: *OPC? makes sure the simulator has read it.
-      instrument.query("*OPC?", -1);
+      quick.query("*OPC?", -1);
+      const std::string query = command.substr(0, command.find(' ')) + "?";
       const Strings wire = outcome == "sent" ? Strings{query, command, "*OPC?"} : Strings{query, "*OPC?"};
       EXPECT_EQ(simulator.getCommands(), wire);
-      EXPECT_FALSE(instrument.sendIfDifferent(command)); // the second push finds the value in place
+      EXPECT_FALSE(quick.sendIfDifferent(command)); // the second push finds the value in place
     }
   }
 }
 
-TEST(InstrumentTest, SendBlockPutsTheSameBytesOnTheWireWhateverTheThreshold) {
-  SimulatedInstrument simulator;
-  TestInstrument instrument(simulator.getAddress(), 2000);
+TEST_F(InstrumentTest, SendBlockPutsTheSameBytesOnTheWireWhateverTheThreshold) {
   const struct {
     const char *command;
     std::size_t size;
@@ -164,8 +139,8 @@ TEST(InstrumentTest, SendBlockPutsTheSameBytesOnTheWireWhateverTheThreshold) {
     auto data = pattern(row.size);
     simulator.setRecording(false);
     simulator.setRecording(true);
-    instrument.sendBlock(row.command, data, row.maxBlockSize);
-    EXPECT_EQ(instrument.query("*OPC?", -1), "1");
+    instrument->sendBlock(row.command, data, row.maxBlockSize);
+    EXPECT_EQ(instrument->query("*OPC?", -1), "1");
     // The last "\r" may still be on its way when the answer is in.
     const std::string expected = row.header + std::string(data.begin(), data.end()) + "\n\r*OPC?\n";
     EXPECT_EQ(simulator.getRecordedBytes().substr(0, expected.size()), expected);
@@ -173,65 +148,59 @@ TEST(InstrumentTest, SendBlockPutsTheSameBytesOnTheWireWhateverTheThreshold) {
   EXPECT_EQ(simulator.getBlock("SOUR:WAV:DATA"), pattern(5));
 }
 
-TEST(InstrumentTest, FailuresThrowTheirTextOrEndEmptyByThrowOnError) {
-  auto simulator = std::make_unique<SimulatedInstrument>();
-  const std::string address = simulator->getAddress();
-  TestInstrument connected(address, 1000);
-  EXPECT_EQ(connected.query("*OPC?", -1), "1");
-  simulator.reset(); // the open connection is gone, and the port refuses from now on
+TEST_F(InstrumentTest, FailuresThrowTheirTextOrEndEmptyByThrowOnError) {
+  EXPECT_EQ(instrument->query("*OPC?", -1), "1");
+  simulator.stop(); // the open connection is gone, and the port refuses from now on
 
   // The peer's reset shows as a failed send, and the session's own text is
   // lost in the message.
-  connected.setThrowOnError(false);
-  EXPECT_EQ(connected.query("*OPC?", -1), "");
-  connected.setThrowOnError(true);
-  EXPECT_EQ(thrown([&] { connected.query("*IDN?", -1); }), "runtime_error: Application Exception(*IDN?)");
+  instrument->setThrowOnError(false);
+  EXPECT_EQ(instrument->query("*OPC?", -1), "");
+  instrument->setThrowOnError(true);
+  EXPECT_EQ(thrown([&] { instrument->query("*IDN?", -1); }), "runtime_error: Application Exception(*IDN?)");
 
-  TestInstrument instrument(address, 1000);
-  EXPECT_EQ(thrown([&] { instrument.query("*IDN?", -1); }), "runtime_error: Failed to send SCPI *IDN? to " + address);
-  instrument.setThrowOnError(false);
+  TestInstrument fresh(address(), 1000);
+  EXPECT_EQ(thrown([&] { fresh.query("*IDN?", -1); }), "runtime_error: Failed to send SCPI *IDN? to " + address());
+  fresh.setThrowOnError(false);
   std::vector<unsigned char> data(5000);
-  EXPECT_EQ(instrument.query("*IDN?", -1), "");
-  EXPECT_EQ(instrument.queryNumber("FREQ?"), 0.0);
-  EXPECT_EQ(instrument.queryArray("MMEM:DATA? 'w'"), "");
-  EXPECT_TRUE(instrument.queryBlock("MMEM:DATA? 'w'", 0).empty());
-  EXPECT_EQ(thrown([&] { instrument.send("FREQ 1"), instrument.sendBlock("MMEM:DATA 'w'", data, 0); }), "nothing");
+  EXPECT_EQ(fresh.query("*IDN?", -1), "");
+  EXPECT_EQ(fresh.queryNumber("FREQ?"), 0.0);
+  EXPECT_EQ(fresh.queryArray("MMEM:DATA? 'w'"), "");
+  EXPECT_TRUE(fresh.queryBlock("MMEM:DATA? 'w'", 0).empty());
+  EXPECT_EQ(thrown([&] { fresh.send("FREQ 1"), fresh.sendBlock("MMEM:DATA 'w'", data, 0); }), "nothing");
   // Without an answer there is nothing to compare with.
-  EXPECT_EQ(thrown([&] { instrument.sendIfDifferent("FREQ 1"); }), "invalid_argument: The SCPI command is incorrrect.");
+  EXPECT_EQ(thrown([&] { fresh.sendIfDifferent("FREQ 1"); }), "invalid_argument: The SCPI command is incorrrect.");
 }
 
-TEST(InstrumentTest, ConnectsOnFirstUseAndPerOperationWhenAsked) {
-  SimulatedInstrument simulator;
-  TestInstrument instrument(simulator.getAddress(), 2000);
+TEST_F(InstrumentTest, ConnectsOnFirstUseAndPerOperationWhenAsked) {
   EXPECT_EQ(simulator.getConnectionCount(), 0U);
-  instrument.query("*OPC?", -1);
-  instrument.query("*OPC?", -1);
+  instrument->query("*OPC?", -1);
+  instrument->query("*OPC?", -1);
   EXPECT_EQ(simulator.getConnectionCount(), 1U);
-  instrument.setDisconnectAfterUse(true);
+  instrument->setDisconnectAfterUse(true);
   for (int i = 0; i < 3; ++i)
-    EXPECT_EQ(instrument.query("*IDN?", -1), SimulatorOptions().identity);
+    EXPECT_EQ(instrument->query("*IDN?", -1), SimulatorOptions().identity);
   EXPECT_EQ(simulator.getConnectionCount(), 3U); // the open one is used once more, then one per query
 }
 
-TEST(InstrumentTest, ClipUsesTheRangeKeptByNameOrTheInstrumentLimits) {
-  SimulatedInstrument simulator;
-  auto instrument = std::make_shared<TestInstrument>(simulator.getAddress(), 2000);
+TEST_F(InstrumentTest, ClipUsesTheRangeKeptByNameOrTheInstrumentLimits) {
   auto &ranges = instrument->getHardwareResource()->getRanges();
   ranges["Stepped"] = {0.0, 100.0, 10.0};
   const double tiny = std::numeric_limits<double>::min();
+  auto &i = *instrument;
   const struct {
     const char *name;
     double value;
     std::function<void(const std::shared_ptr<DoubleSetting> &)> clip;
     double expected;
   } rows[] = {
-      {"Frequency", 1e10, [&](auto &s) { instrument->queryAndClip(s, instrument, "FREQ"); }, 6e9},
-      {"Power", -200.0, [&](auto &s) { instrument->queryAndClip(s, instrument, "POW"); }, -130.0},
-      {"Default", -5.0, [&](auto &s) { instrument->clip(s); }, tiny}, // a new range starts above zero
-      {"Limited", 20.0, [&](auto &s) { instrument->setAndClip(s, 0.0, 10.0); }, 10.0},
-      {"Stepped", 37.0, [&](auto &s) { instrument->clip(s); }, 40.0},
-      {"Stepped", 37.0, [&](auto &s) { instrument->clip(s, 25.0); }, 25.0},
-      {"Stepped", 37.0, [&](auto &s) { instrument->setAndClip(s, 0.0, 30.0, 4.0); }, 30.0},
+      {"Frequency", 1e10, [&](auto &s) { i.queryAndClip(s, instrument, "FREQ"); }, 6e9},
+      {"Power", -200.0, [&](auto &s) { i.queryAndClip(s, instrument, "POW"); }, -130.0},
+      {"Default", -5.0, [&](auto &s) { i.clip(s); }, tiny}, // a new range starts above zero
+      {"Limited", 20.0, [&](auto &s) { i.setAndClip(s, 0.0, 10.0); }, 10.0},
+      {"Stepped", 37.0, [&](auto &s) { i.clip(s); }, 40.0},
+      {"Stepped", 37.0, [&](auto &s) { i.clip(s, 25.0); }, 25.0},
+      {"Stepped", 37.0, [&](auto &s) { i.setAndClip(s, 0.0, 30.0, 4.0); }, 30.0},
   };
   for (const auto &row : rows) {
     SCOPED_TRACE(row.name);

@@ -2,8 +2,8 @@
 
 #include "platform/Socket.h"
 #include "support/ExpectThrow.h"
+#include "support/TestInstrument.h"
 #include "wavemill/services/LogBase.h"
-#include "wavemill/simulator/SimulatedInstrument.h"
 
 #include <gtest/gtest.h>
 
@@ -11,7 +11,7 @@
 #include <thread>
 
 using namespace Corvane::Wavemill;
-using Testing::thrownMessage;
+using Testing::thrown;
 using Clock = std::chrono::steady_clock;
 
 namespace {
@@ -50,72 +50,54 @@ private:
   std::thread thread;
 };
 
-// The texts written to the channel "Log" while it lives.
-struct LogProbe {
-  LogProbe()
-      : subscription(LogBase::get("Log")->getSubject().get_observable().subscribe(
-            [this](LogMessage *message) { texts.push_back(message->text); })) {}
-  ~LogProbe() { subscription.unsubscribe(); }
-  std::vector<std::string> texts;
-  rx::subscription subscription;
+// A simulated instrument and a LAN session connected to it.
+class LanIOSessionTest : public ::testing::Test, protected Testing::SimulatedBench {
+protected:
+  void SetUp() override { ASSERT_TRUE(session.connect()); }
+  LanIOSession session{"127.0.0.1", port()};
 };
-
-std::vector<unsigned char> bytes(const std::string &text) { return {text.begin(), text.end()}; }
 
 } // namespace
 
-TEST(LanIOSessionTest, ReadLineKeepsFullBuffersAndDropsShortPiecesWithoutEnd) {
+TEST(LanIOSessionReadTest, ReadsKeepFullBuffersAndDropShortPiecesAndBlocksTakeTheAnnouncedBytes) {
   const struct {
     const char *name;
     std::vector<std::string> pieces;
-    std::string line;
-  } cases[] = {
-      {"CR LF in one piece", {"Corvane,SG200\r\n"}, "Corvane,SG200"},
-      {"short piece without end", {"stray", "second\n"}, "second"},
-      {"full buffer without end", {std::string(8192, 'a'), "b\n"}, std::string(8192, 'a') + "b"},
-      {"two lines in one piece", {"1\n2\n"}, "1\n2"},
-      {"zero byte ends", {std::string("ok\0", 3)}, "ok"},
-      {"stream ends without line end", {"cut"}, ""},
-  };
-  for (const auto &row : cases) {
-    SCOPED_TRACE(row.name);
-    ScriptedServer server(row.pieces);
-    LanIOSession session("127.0.0.1", server.port());
-    ASSERT_TRUE(session.connect());
-    EXPECT_EQ(session.readLine(), row.line);
-  }
-}
-
-TEST(LanIOSessionTest, ReadBlockTakesTheAnnouncedBytesOrGivesUpTheConnection) {
-  const struct {
-    const char *name;
-    std::vector<std::string> pieces;
-    std::string block;
+    bool block; // readBlock, else readLine
+    std::string answer;
     bool connectedAfter;
   } cases[] = {
-      {"one digit, five bytes", {"#15ab\ncd\n"}, "ab\ncd", true},
-      {"body in two pieces", {"#15ab", "cde\n"}, "abcde", true},
-      {"digit count 0 reads on", {"#0\n"}, "", true},
-      {"length 0", {"#10\n"}, "", true},
-      {"short body", {"#3100", "ab"}, "", false},
-      {"length is no number", {"#2x1abc\n"}, "", false},
+      {"CR LF in one piece", {"Corvane,SG200\r\n"}, false, "Corvane,SG200", true},
+      {"short piece without end", {"stray", "second\n"}, false, "second", true},
+      {"full buffer without end", {std::string(8192, 'a'), "b\n"}, false, std::string(8192, 'a') + "b", true},
+      {"two lines in one piece", {"1\n2\n"}, false, "1\n2", true},
+      {"zero byte ends", {std::string("ok\0", 3)}, false, "ok", true},
+      {"stream ends without line end", {"cut"}, false, "", true},
+      {"one digit, five bytes", {"#15ab\ncd\n"}, true, "ab\ncd", true},
+      {"body in two pieces", {"#15ab", "cde\n"}, true, "abcde", true},
+      {"digit count 0 reads on", {"#0\n"}, true, "", true},
+      {"length 0", {"#10\n"}, true, "", true},
+      {"short body", {"#3100", "ab"}, true, "", false},
+      {"length is no number", {"#2x1abc\n"}, true, "", false},
   };
   for (const auto &row : cases) {
     SCOPED_TRACE(row.name);
     ScriptedServer server(row.pieces);
     LanIOSession session("127.0.0.1", server.port());
     ASSERT_TRUE(session.connect());
-    EXPECT_EQ(session.readBlock("DATA?"), bytes(row.block));
-    EXPECT_EQ(session.getConnected(), row.connectedAfter);
+    if (row.block) {
+      const auto block = session.readBlock("DATA?");
+      EXPECT_EQ(std::string(block.begin(), block.end()), row.answer);
+      EXPECT_EQ(session.getConnected(), row.connectedAfter);
+    } else {
+      EXPECT_EQ(session.readLine(), row.answer);
+    }
   }
 }
 
-TEST(LanIOSessionTest, WireCarriesLineFeedThenCarriageReturnAndBlockHeaders) {
-  SimulatedInstrument instrument;
-  LanIOSession session("127.0.0.1", instrument.getPort());
-  ASSERT_TRUE(session.connect());
-  instrument.setRecording(true);
-  std::vector<unsigned char> data = bytes(std::string("\0\x01\n\r\xff", 5));
+TEST_F(LanIOSessionTest, WireCarriesLineFeedThenCarriageReturnAndBlockHeaders) {
+  simulator.setRecording(true);
+  std::vector<unsigned char> data = {0, 1, '\n', '\r', 0xff};
   session.writeLine("FREQ 1e9");
   session.writeBlock("MMEM:DATA 'w',", data);
   session.writeManyBlocksStart("MMEM:DATA 'm',", gsl::span<unsigned char>(data).first(2), 5);
@@ -123,24 +105,20 @@ TEST(LanIOSessionTest, WireCarriesLineFeedThenCarriageReturnAndBlockHeaders) {
   session.writeManyBlocksEnd();
   ASSERT_EQ(session.query("*OPC?"), "1"); // everything before has been read
   const std::string body(data.begin(), data.end());
-  EXPECT_EQ(instrument.getRecordedBytes(),
+  EXPECT_EQ(simulator.getRecordedBytes(),
             "FREQ 1e9\n\rMMEM:DATA 'w',#15" + body + "\n\rMMEM:DATA 'm',#15" + body + "\n\r*OPC?\n\r");
-  EXPECT_EQ(instrument.getBlock("m"), data);
-}
+  EXPECT_EQ(simulator.getBlock("m"), data);
 
-TEST(LanIOSessionTest, LargeBlockRoundTripComesBackEqual) {
-  SimulatedInstrument instrument;
-  LanIOSession session("127.0.0.1", instrument.getPort());
-  ASSERT_TRUE(session.connect());
-  std::vector<unsigned char> data(64 << 20);
-  for (std::size_t i = 0; i < data.size(); ++i)
-    data[i] = static_cast<unsigned char>(i * 7 % 251);
-  session.writeBlock("MMEM:DATA 'big',", data);
   // Far more than one TCP segment: the body must be collected, not lost.
-  EXPECT_TRUE(session.readBlock("MMEM:DATA? 'big'") == data);
+  std::vector<unsigned char> big(64 << 20);
+  for (std::size_t i = 0; i < big.size(); ++i)
+    big[i] = static_cast<unsigned char>(i * 7 % 251);
+  simulator.setRecording(false);
+  session.writeBlock("MMEM:DATA 'big',", big);
+  EXPECT_TRUE(session.readBlock("MMEM:DATA? 'big'") == big);
 }
 
-TEST(LanIOSessionTest, ConnectFailsOnRefusalButNotOnAnUnfinishedHandshake) {
+TEST(LanIOSessionConnectTest, ConnectFailsOnRefusalButNotOnAnUnfinishedHandshake) {
   const auto closed = Platform::listenTcp("127.0.0.1", 0, 1);
   const int closedPort = Platform::localPort(closed);
   Platform::closeSocket(closed);
@@ -165,45 +143,41 @@ TEST(LanIOSessionTest, ConnectFailsOnRefusalButNotOnAnUnfinishedHandshake) {
   Platform::closeSocket(listener);
 }
 
-TEST(LanIOSessionTest, WithoutConnectionTransfersThrowOrClearTheFlag) {
+TEST_F(LanIOSessionTest, WithoutConnectionTransfersThrowOrClearTheFlag) {
   LanIOSession idle("127.0.0.1", 1);
-  EXPECT_EQ(thrownMessage<InstrumentException>([&] { idle.writeLine("*RST"); }),
-            "Failed to send SCPI *RST to 127.0.0.1");
-  const std::string readText = "An I/O error occurred while attempting to read from TCP/IP connection 127.0.0.1";
-  EXPECT_EQ(thrownMessage<InstrumentException>([&] { idle.readLine(); }), readText);
-  EXPECT_EQ(thrownMessage<InstrumentException>([&] { idle.readBlock("DATA?"); }), readText);
+  const std::string readText =
+      "InstrumentException: An I/O error occurred while attempting to read from TCP/IP connection 127.0.0.1";
   std::vector<unsigned char> data(16, 1);
-  EXPECT_EQ(thrownMessage<InstrumentException>([&] { idle.writeBlock("DATA ", data); }), "Connection error.");
-  EXPECT_EQ(thrownMessage<InstrumentException>([&] { idle.writeManyBlocksStart("DATA ", data, 32); }),
-            "Connection error.");
-  EXPECT_NO_THROW(idle.writeManyBlocks(data));
+  EXPECT_EQ(thrown([&] { idle.writeLine("*RST"); }), "InstrumentException: Failed to send SCPI *RST to 127.0.0.1");
+  EXPECT_EQ(thrown([&] { idle.readLine(); }), readText);
+  EXPECT_EQ(thrown([&] { idle.readBlock("DATA?"); }), readText);
+  EXPECT_EQ(thrown([&] { idle.writeBlock("DATA ", data); }), "InstrumentException: Connection error.");
+  EXPECT_EQ(thrown([&] { idle.writeManyBlocksStart("DATA ", data, 32); }), "InstrumentException: Connection error.");
+  EXPECT_EQ(thrown([&] { idle.writeManyBlocks(data); }), "nothing");
 
   // The instrument hangs up at once: sends fail within a few tries and clear
   // the flag instead of throwing.
-  SimulatorOptions options;
-  options.fault = SimulatorFault::RefuseConnections;
-  SimulatedInstrument instrument(options);
-  LanIOSession session("127.0.0.1", instrument.getPort());
-  ASSERT_TRUE(session.connect());
-  for (int i = 0; i < 50 && session.getConnected(); ++i) {
-    EXPECT_NO_THROW(session.writeManyBlocks(data));
+  simulator.setFault(SimulatorFault::RefuseConnections);
+  LanIOSession refused("127.0.0.1", port());
+  ASSERT_TRUE(refused.connect());
+  for (int i = 0; i < 50 && refused.getConnected(); ++i) {
+    EXPECT_EQ(thrown([&] { refused.writeManyBlocks(data); }), "nothing");
     std::this_thread::sleep_for(std::chrono::milliseconds(10));
   }
-  EXPECT_FALSE(session.getConnected());
+  EXPECT_FALSE(refused.getConnected());
 }
 
-TEST(LanIOSessionTest, SilentInstrumentAnswersEmptyAfterTheTimeoutAndLogs) {
-  SimulatorOptions options;
-  options.fault = SimulatorFault::Stall;
-  SimulatedInstrument instrument(options);
-  LanIOSession session("127.0.0.1", instrument.getPort());
-  ASSERT_TRUE(session.connect());
+TEST_F(LanIOSessionTest, SilentInstrumentAnswersEmptyAfterTheTimeoutAndLogs) {
+  simulator.setFault(SimulatorFault::Stall);
   session.setTimeoutInMS(300); // applied to the open socket at once
-  LogProbe log;
+  std::vector<std::string> logged;
+  auto subscription = LogBase::get("Log")->getSubject().get_observable().subscribe(
+      [&](LogMessage *message) { logged.push_back(message->text); });
   const auto start = Clock::now();
   EXPECT_EQ(session.query("*IDN?"), "");
   EXPECT_GE(Clock::now() - start, std::chrono::milliseconds(250));
-  ASSERT_EQ(log.texts.size(), 1U);
-  EXPECT_EQ(log.texts[0].rfind("WSA error ", 0), 0U);
+  subscription.unsubscribe();
+  ASSERT_EQ(logged.size(), 1U);
+  EXPECT_EQ(logged[0].rfind("WSA error ", 0), 0U);
   EXPECT_TRUE(session.getConnected()); // a time-out does not close
 }

@@ -2,14 +2,12 @@
 // TCP, whose call recorder shows each VISA call the session makes.
 #include "wavemill/instrument/VisaIOSession.h"
 
+#include "CorVisa.h"
 #include "instrument/VisaStatusText.h"
 #include "platform/Environment.h"
-#include "platform/Module.h"
 #include "support/ExpectThrow.h"
 #include "support/TestInstrument.h"
 #include "wavemill/instrument/HardwareResource.h"
-#include "wavemill/simulator/SimulatedInstrument.h"
-#include "wavemill/tools/Tools.h"
 
 #include <gtest/gtest.h>
 
@@ -18,44 +16,14 @@
 #include <thread>
 
 using namespace Corvane::Wavemill;
+using Testing::pattern;
+using Testing::VisaCalls;
 using Strings = std::vector<std::string>;
 
 namespace {
 
 const std::string endOff = "viSetAttribute 0x3FFF0016 0";
 const std::string endOn = "viSetAttribute 0x3FFF0016 1";
-
-// The VISA calls corvisa records between start() and stop().
-class VisaCalls {
-public:
-  VisaCalls() {
-    std::string error;
-    void *module = Platform::loadModule(Platform::environmentVariable("WAVEMILL_VISA_LIBRARY"), error);
-    record = reinterpret_cast<int (*)(int)>(Platform::moduleSymbol(module, "corvisa_record"));
-    take = reinterpret_cast<int (*)(char *, int)>(Platform::moduleSymbol(module, "corvisa_record_take"));
-    statusDesc = reinterpret_cast<int (*)(unsigned, int, char *)>(Platform::moduleSymbol(module, "viStatusDesc"));
-  }
-  bool present() const { return record != nullptr && take != nullptr && statusDesc != nullptr; }
-  void start() { record(1); }
-  Strings stop() {
-    record(0);
-    std::string text(static_cast<std::size_t>(take(nullptr, 0)) + 1, '\0');
-    text.resize(static_cast<std::size_t>(take(text.data(), static_cast<int>(text.size()))));
-    return Tools::split(text, '\n');
-  }
-  int (*statusDesc)(unsigned, int, char *) = nullptr;
-
-private:
-  int (*record)(int) = nullptr;
-  int (*take)(char *, int) = nullptr;
-};
-
-std::vector<unsigned char> pattern(std::size_t size) {
-  std::vector<unsigned char> bytes(size);
-  for (std::size_t i = 0; i < size; ++i)
-    bytes[i] = static_cast<unsigned char>(i * 7); // zero bytes, '\n' and '#' included
-  return bytes;
-}
 
 // What the simulator has received once `size` bytes are in, or after 2 s.
 std::string receivedBytes(const SimulatedInstrument &simulator, std::size_t size) {
@@ -66,44 +34,40 @@ std::string receivedBytes(const SimulatedInstrument &simulator, std::size_t size
   return bytes;
 }
 
-// A VISA session over a socket to a simulated instrument, and corvisa's
-// record of the calls.
-class VisaIOSessionTest : public ::testing::Test {
+std::string text(const std::vector<unsigned char> &bytes) { return {bytes.begin(), bytes.end()}; }
+
+// A VISA session over a socket to a simulated instrument.
+class VisaIOSessionTest : public ::testing::Test, protected Testing::SimulatedBench {
 protected:
-  void SetUp() override {
-    ASSERT_TRUE(calls.present());
-    ASSERT_TRUE(session.connect());
-  }
-  VisaCalls calls;
-  SimulatedInstrument simulator;
-  VisaIOSession session{simulator.getAddress()};
+  void SetUp() override { ASSERT_TRUE(session.connect()); }
+  VisaIOSession session{address()};
 };
 
 } // namespace
 
 TEST_F(VisaIOSessionTest, InstrumentAndHardwareResourceWorkOnVisaAddressesAsOnLan) {
-  ASSERT_TRUE(Platform::setEnvironmentVariable("CORVISA_INSTR_PORT", std::to_string(simulator.getPort())));
+  ASSERT_TRUE(Platform::setEnvironmentVariable("CORVISA_INSTR_PORT", std::to_string(port())));
   const auto payload = pattern(3 << 20);
   // This transport's block header names the digit count only, so the
   // simulator reads the data's first seven bytes as the length.
   const std::string length = std::to_string(payload.size());
   std::vector<unsigned char> data(length.begin(), length.end());
   data.insert(data.end(), payload.begin(), payload.end());
-  for (const std::string &address : {simulator.getAddress(), std::string("TCPIP0::127.0.0.1::inst0::INSTR")}) {
-    SCOPED_TRACE(address);
-    calls.start();
-    auto instrument = std::make_shared<Testing::TestInstrument>(address, 5000);
-    instrument->setIOSession(std::make_shared<VisaIOSession>(address));
+  for (const std::string &visaAddress : {address(), std::string("TCPIP0::127.0.0.1::inst0::INSTR")}) {
+    SCOPED_TRACE(visaAddress);
+    VisaCalls calls;
+    auto visaInstrument = std::make_shared<Testing::TestInstrument>(visaAddress, 5000);
+    visaInstrument->setIOSession(std::make_shared<VisaIOSession>(visaAddress));
     HardwareResource resource;
-    resource.updateConnection(instrument);
+    resource.updateConnection(visaInstrument);
     EXPECT_EQ((Strings{resource.getManufacturer(), resource.getModelNumber(), resource.getOptions()}),
               (Strings{"Corvane", "SG200", SimulatorOptions().options}));
-    instrument->send("FREQ 2E9");
-    EXPECT_EQ(instrument->query("FREQ?", -1), "2E9");
-    instrument->sendBlock("MMEM:DATA 'w'", data, 0);
-    instrument->send("*CLS"); // takes up the 0x00 that ends the block, which is no SCPI
-    EXPECT_EQ(instrument->queryBlock("MMEM:DATA? 'w'", 0), payload);
-    EXPECT_EQ(calls.stop().at(1), "viOpen " + address);
+    visaInstrument->send("FREQ 2E9");
+    EXPECT_EQ(visaInstrument->query("FREQ?", -1), "2E9");
+    visaInstrument->sendBlock("MMEM:DATA 'w'", data, 0);
+    visaInstrument->send("*CLS"); // takes up the 0x00 that ends the block, which is no SCPI
+    EXPECT_EQ(visaInstrument->queryBlock("MMEM:DATA? 'w'", 0), payload);
+    EXPECT_EQ(calls.stop().at(1), "viOpen " + visaAddress);
   }
 }
 
@@ -113,34 +77,33 @@ TEST_F(VisaIOSessionTest, BlockWritesGoInPiecesWithEndBeforeTheLastOne) {
     auto part = pattern(size);
     session.writeManyBlocks(part);
   };
-  const auto bytes = [](std::size_t size) {
-    const auto data = pattern(size);
-    return std::string(data.begin(), data.end());
-  };
   const struct {
     const char *name;
     std::function<void()> write;
     Strings calls;
     std::string wire;
   } rows[] = {
-      {"whole pieces", [&] { writeParts(2048); }, {endOff, "viWrite 1024", endOff, "viWrite 1024"}, bytes(2048)},
-      {"a rest", [&] { writeParts(1500); }, {endOff, "viWrite 1024", endOff, "viWrite 476"}, bytes(1500)},
+      {"whole pieces",
+       [&] { writeParts(2048); },
+       {endOff, "viWrite 1024", endOff, "viWrite 1024"},
+       text(pattern(2048))},
+      {"a rest", [&] { writeParts(1500); }, {endOff, "viWrite 1024", endOff, "viWrite 476"}, text(pattern(1500))},
       {"nothing", [&] { session.writeManyBlocks({}); }, {endOff}, ""},
       {"end", [&] { session.writeManyBlocksEnd(); }, {endOff, endOn, "viWrite 1"}, std::string(1, '\0')},
       {"block",
        [&] { session.writeBlock("MMEM:DATA 'a',", five); },
        {endOff, endOff, "viWrite 16", endOff, endOff, "viWrite 5", endOff, endOn, "viWrite 1"},
-       "MMEM:DATA 'a',#1" + bytes(5) + std::string(1, '\0')},
+       "MMEM:DATA 'a',#1" + text(five) + std::string(1, '\0')},
       {"many blocks",
        [&] { session.writeManyBlocksStart("MMEM:DATA 'a',", five, 1234567); },
        {endOff, endOff, "viWrite 23", endOff, endOff, "viWrite 5"},
-       "MMEM:DATA 'a',#71234567" + bytes(5)},
+       "MMEM:DATA 'a',#71234567" + text(five)},
   };
   for (const auto &row : rows) {
     SCOPED_TRACE(row.name);
     simulator.setRecording(false);
     simulator.setRecording(true);
-    calls.start();
+    VisaCalls calls;
     row.write();
     EXPECT_EQ(calls.stop(), row.calls);
     EXPECT_EQ(receivedBytes(simulator, row.wire.size()), row.wire);
@@ -148,8 +111,7 @@ TEST_F(VisaIOSessionTest, BlockWritesGoInPiecesWithEndBeforeTheLastOne) {
 }
 
 TEST_F(VisaIOSessionTest, WriteRaisesTheTimeOutForLongTextsOnlyAndRestoresIt) {
-  const std::string before = "viGetAttribute 0x3FFF0016";
-  const std::string timeout = "viGetAttribute 0x3FFF001A";
+  const std::string before = "viGetAttribute 0x3FFF0016", timeout = "viGetAttribute 0x3FFF001A";
   const struct {
     std::size_t length;
     Strings calls;
@@ -162,30 +124,47 @@ TEST_F(VisaIOSessionTest, WriteRaisesTheTimeOutForLongTextsOnlyAndRestoresIt) {
   };
   for (const auto &row : rows) {
     SCOPED_TRACE(row.length);
-    calls.start();
+    VisaCalls calls;
     session.writeLine(std::string(row.length, 'A'));
     EXPECT_EQ(calls.stop(), row.calls);
     EXPECT_EQ(session.getTimeoutInMS(), 6000);
   }
 }
 
+// The answer's header "#<digits><length>" is read a byte at a time; a digit
+// count or a length digit that is no digit ends the block, and the rest of
+// the answer is cleared away.
 TEST_F(VisaIOSessionTest, ReadBlockReadsHeaderBodyAndTerminatorAndClearsAfterAText) {
   session.writeLine("FREQ 5");
   auto block = pattern(12);
   session.writeManyBlocksStart("MMEM:DATA 'b',", block, 12);
   ASSERT_EQ(session.query("*OPC?"), "1\n");
+  const auto reads = [&](int count, Strings tail) {
+    Strings all(static_cast<std::size_t>(count), "viRead 1");
+    all.insert(all.end(), tail.begin(), tail.end());
+    return all;
+  };
   const struct {
     const char *command;
-    std::vector<unsigned char> block;
+    const char *identity; // the answer to *IDN?
+    std::string block;
     Strings reads;
   } rows[] = {
-      {"MMEM:DATA? 'b'", pattern(12), {"viRead 1", "viRead 1", "viRead 1", "viRead 1", "viRead 12", "viRead 1"}},
-      {"FREQ?", {}, {"viRead 1", "viClear"}}, // the rest of the text is thrown away
+      {"MMEM:DATA? 'b'", "", text(pattern(12)), reads(4, {"viRead 12", "viRead 1"})},
+      {"FREQ?", "", "", reads(1, {"viClear"})}, // the rest of the text is thrown away
+      {"*IDN?", "#9000000005abcde", "abcde", reads(11, {"viRead 5", "viRead 1"})},
+      {"*IDN?", "#209abcdefghi", "abcdefghi", reads(4, {"viRead 9", "viRead 1"})},
+      {"*IDN?", "#0", "", reads(3, {})},
+      {"*IDN?", "#/1a", "", reads(2, {"viClear"})},
+      {"*IDN?", "#:1a", "", reads(2, {"viClear"})},
+      {"*IDN?", "#2/1a", "", reads(3, {"viClear"})},
+      {"*IDN?", "#21:a", "", reads(4, {"viClear"})},
   };
   for (const auto &row : rows) {
-    SCOPED_TRACE(row.command);
-    calls.start();
-    EXPECT_EQ(session.readBlock(row.command), row.block);
+    SCOPED_TRACE(std::string(row.command) + " " + row.identity);
+    simulator.setIdentity(row.identity);
+    VisaCalls calls;
+    EXPECT_EQ(text(session.readBlock(row.command)), row.block);
     const auto written = "viWrite " + std::to_string(std::string(row.command).size() + 1);
     // END was off after the block start and is put back so.
     Strings expected = {"viGetAttribute 0x3FFF0016", endOn, "viGetAttribute 0x3FFF001A", written, endOff};
@@ -196,13 +175,13 @@ TEST_F(VisaIOSessionTest, ReadBlockReadsHeaderBodyAndTerminatorAndClearsAfterATe
 
 TEST_F(VisaIOSessionTest, VisaFailuresThrowTheDescriptionWithOnlyPlainBytes) {
   char description[256] = {};
-  ASSERT_EQ(calls.statusDesc(0, 0x12345, description), 0);
+  ASSERT_EQ(Testing::visa().viStatusDesc(0, 0x12345, description), 0);
   EXPECT_EQ(visaStatusText(description, sizeof description), "Unknown status      code ");
 
   simulator.setFault(SimulatorFault::Stall);
   session.setTimeoutInMS(100);
   session.writeLine("*IDN?");
-  EXPECT_EQ(Testing::thrownLibraryException([&] { session.readLine(); }),
+  EXPECT_EQ(Testing::thrown([&] { session.readLine(); }),
             "ApplicationException: VI_ERROR_TMO: Timeout expired before operation completed. ");
   EXPECT_TRUE(session.getConnected()); // a failed transfer leaves the session open
   EXPECT_FALSE(VisaIOSession("TCPIP0::127.0.0.1::1::SOCKET").connect());
@@ -227,7 +206,7 @@ TEST_F(VisaIOSessionTest, DiscoverListsTheConfiguredResourcesThatMatchAndClosesI
   };
   for (const auto &row : rows) {
     SCOPED_TRACE(row.expression);
-    calls.start();
+    VisaCalls calls;
     EXPECT_EQ(VisaIOSession::discover(row.expression), row.found);
     EXPECT_EQ(calls.stop(), row.calls);
   }

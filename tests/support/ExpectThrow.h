@@ -2,44 +2,32 @@
 
 #include "wavemill/tools/Exceptions.h"
 
-#include <gtest/gtest.h>
-
+#include <stdexcept>
 #include <string>
-#include <type_traits>
 
 namespace Corvane::Wavemill::Testing {
 
-/// The message of the exception of type `E` that `action` throws:
-/// getMessage() for the library's own exceptions, what() for the others.
-/// A test failure and "" when `action` throws nothing or something else.
-/// Example: EXPECT_EQ(thrownMessage<InstrumentException>([&] { s.writeLine("x"); }), "...").
-template <class E, class F> std::string thrownMessage(F &&action) {
-  try {
-    action();
-  } catch (const E &error) {
-    if constexpr (std::is_base_of_v<ApplicationException, E>)
-      return error.getMessage();
-    else
-      return error.what();
-  } catch (...) {
-    ADD_FAILURE() << "an exception of another type was thrown";
-    return {};
-  }
-  ADD_FAILURE() << "nothing was thrown";
-  return {};
-}
-
-/// Which of the library's two instrument-layer exceptions `action` throws,
-/// with its message: "InstrumentException: text", "ApplicationException:
-/// text" for an ApplicationException that is no InstrumentException, or
-/// "nothing". Other exceptions pass through.
-template <class F> std::string thrownLibraryException(F &&action) {
+/// What `action` throws, as "Type: message" in one comparable string: the
+/// library's own exceptions with getMessage() ("InstrumentException: ...",
+/// "ArgumentOutOfRangeException: ...", "ApplicationException: ..." for the
+/// others), std::invalid_argument, std::out_of_range and other
+/// std::runtime_errors with what(); "nothing" when nothing is thrown.
+/// Example: EXPECT_EQ(thrown([&] { s.writeLine("x"); }), "InstrumentException: ...").
+template <class F> std::string thrown(F &&action) {
   try {
     action();
   } catch (const InstrumentException &error) {
     return "InstrumentException: " + error.getMessage();
+  } catch (const ArgumentOutOfRangeException &error) {
+    return "ArgumentOutOfRangeException: " + error.getMessage();
   } catch (const ApplicationException &error) {
     return "ApplicationException: " + error.getMessage();
+  } catch (const std::invalid_argument &error) {
+    return std::string("invalid_argument: ") + error.what();
+  } catch (const std::out_of_range &error) {
+    return std::string("out_of_range: ") + error.what();
+  } catch (const std::runtime_error &error) {
+    return std::string("runtime_error: ") + error.what();
   }
   return "nothing";
 }

@@ -1,9 +1,12 @@
 #pragma once
 
 #include "wavemill/instrument/Instrument.h"
+#include "wavemill/simulator/SimulatedInstrument.h"
 
+#include <memory>
 #include <string>
 #include <utility>
+#include <vector>
 
 namespace Corvane::Wavemill::Testing {
 
@@ -18,5 +21,33 @@ public:
   void setDisconnectAfterUse(bool on) { disconnectAfterUse = on; }
   std::string getOptions() override { return query("*OPT?", -1); }
 };
+
+/// Options of a simulated instrument that starts in `fault` mode.
+inline SimulatorOptions faulty(SimulatorFault fault) {
+  SimulatorOptions options;
+  options.fault = fault;
+  return options;
+}
+
+/// A simulated instrument on 127.0.0.1, started with `options`, and an
+/// instrument on its address that connects on first use.
+struct SimulatedBench {
+  explicit SimulatedBench(SimulatorOptions options = {}, int timeoutInMS = 2000)
+      : simulator(std::move(options)),
+        instrument(std::make_shared<TestInstrument>(simulator.getAddress(), timeoutInMS)) {}
+  std::string address() const { return simulator.getAddress(); }
+  int port() const { return simulator.getPort(); }
+
+  SimulatedInstrument simulator;
+  std::shared_ptr<TestInstrument> instrument;
+};
+
+/// `size` bytes that hold every value, zero bytes, '\n' and '#' included.
+inline std::vector<unsigned char> pattern(std::size_t size) {
+  std::vector<unsigned char> bytes(size);
+  for (std::size_t i = 0; i < size; ++i)
+    bytes[i] = static_cast<unsigned char>(i * 7);
+  return bytes;
+}
 
 } // namespace Corvane::Wavemill::Testing
