@@ -1,8 +1,11 @@
 #include "wavemill/waveform/BigEndian.h"
+#include "wavemill/waveform/SwapBytes.h"
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <climits>
+#include <cstring>
 #include <string>
 #include <vector>
 
@@ -24,6 +27,16 @@ template <typename T> void expectRoundTrip(const char *row, T value, const Bytes
   BigEndian::parse(gsl::make_span(input), &pos, &back);
   EXPECT_EQ(back, value);
   EXPECT_EQ(pos, static_cast<int>(expected.size()));
+}
+
+// swapBytes gives the value with its bytes in reverse order.
+template <typename T> void expectSwapped(T value) {
+  const T swapped = swapBytes::doit(value);
+  unsigned char in[sizeof(T)], out[sizeof(T)];
+  std::memcpy(in, &value, sizeof(T));
+  std::memcpy(out, &swapped, sizeof(T));
+  std::reverse(out, out + sizeof(T));
+  EXPECT_EQ(std::memcmp(in, out, sizeof(T)), 0) << sizeof(T) << "-byte value";
 }
 
 } // namespace
@@ -126,4 +139,14 @@ TEST(BigEndianTest, ParseBlockSkipsWholeBlocksAndNeverReadsPastTheSpan) {
   unsigned int value = 0;
   const gsl::span<unsigned char> huge(&one, static_cast<std::size_t>(INT_MAX) + 1);
   EXPECT_THROW(BigEndian::parse(huge, &pos, &value), gsl::narrowing_error);
+}
+
+TEST(SwapBytesTest, EveryOverloadReversesItsBytes) {
+  expectSwapped<short>(-2);
+  expectSwapped<unsigned short>(0x1234);
+  expectSwapped<int>(-123456789);
+  expectSwapped<unsigned int>(0x89ABCDEFu);
+  expectSwapped<float>(-1.0f);
+  expectSwapped<double>(9e99);
+  EXPECT_EQ(swapBytes::doit(static_cast<unsigned short>(0x1234)), 0x3412);
 }

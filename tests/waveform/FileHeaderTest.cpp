@@ -1,5 +1,6 @@
 #include "wavemill/waveform/ArbFileHeader.h"
 #include "wavemill/waveform/FlexibleArbFileHeader.h"
+#include "wavemill/waveform/HdrDescript.h"
 
 #include "support/HeaderStreams.h"
 
@@ -170,4 +171,36 @@ TEST(FileHeaderTest, CopyKeepsItsOwnIdAndTakesTheFieldsBothLayoutsShare) {
   ASSERT_NE(same, nullptr);
   EXPECT_EQ(written(*same), written(arb));
   EXPECT_EQ(tagBytes(*same, FileHeader::Tag14), Bytes{0x07});
+}
+
+TEST(HdrDescriptTest, DescriptorLayoutDropsTheLastTextCharacterAndBiasesTheResolution) {
+  hdrDescript built("ABCDEFGHIJKLMNOPQRSTUVWXYZ", DataRes4, -2.5);
+  Bytes descriptor(32);
+  built.getDescript(descriptor.data());
+  Bytes expected(32, 0);
+  for (int i = 0; i < 22; ++i) {
+    expected[static_cast<std::size_t>(i)] = static_cast<unsigned char>('A' + i);
+  }
+  expected[23] = 206;
+  expected[24] = 0xC0, expected[25] = 0x04;
+  EXPECT_EQ(descriptor, expected);
+  char text[23];
+  built.getText(text);
+  EXPECT_EQ(std::string(text, 23), "ABCDEFGHIJKLMNOPQRSTUVW");
+
+  hdrDescript back(descriptor.data());
+  EXPECT_EQ(back.getFreq(), -2.5);
+  back.getText(text);
+  EXPECT_EQ(std::string(text, 23), std::string("ABCDEFGHIJKLMNOPQRSTUV") + '\0');
+
+  const struct {
+    unsigned char stored;
+    DataRes res;
+  } codes[] = {{201, DataResNone}, {202, DataResNone}, {203, DataRes1}, {204, DataRes2},
+               {205, DataResNone}, {206, DataRes4},    {0, DataResNone}};
+  for (const auto &row : codes) {
+    SCOPED_TRACE(static_cast<int>(row.stored));
+    descriptor[23] = row.stored;
+    EXPECT_EQ(hdrDescript(descriptor.data()).getRes(), row.res);
+  }
 }
