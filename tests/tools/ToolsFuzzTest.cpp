@@ -26,9 +26,8 @@ std::string randomBytes(std::mt19937 &random, std::size_t maxLength) {
   std::uniform_int_distribution<std::size_t> length(0, maxLength);
   std::uniform_int_distribution<int> byte(0, 255);
   std::string text(length(random), '\0');
-  for (auto &c : text) {
+  for (auto &c : text)
     c = static_cast<char>(byte(random));
-  }
   return text;
 }
 
@@ -42,24 +41,16 @@ std::string mutate(std::mt19937 &random, std::string text) {
     std::uniform_int_distribution<std::size_t> position(0, text.size());
     const auto at = position(random);
     const char inserted = random() % 2 == 0 ? special[random() % special.size()] : static_cast<char>(random() % 256);
-    switch (operation(random)) {
-    case 0:
-      if (at < text.size()) {
-        text[at] = inserted;
-      }
-      break;
-    case 1:
+    // Change, insert, remove or repeat; the draws stay in this order so that the inputs do not change.
+    const int kind = operation(random);
+    if (kind == 0 && at < text.size())
+      text[at] = inserted;
+    else if (kind == 1)
       text.insert(at, 1, inserted);
-      break;
-    case 2:
-      if (at < text.size()) {
-        text.erase(at, 1 + random() % 3);
-      }
-      break;
-    default:
+    else if (kind == 2 && at < text.size())
+      text.erase(at, 1 + random() % 3);
+    else if (kind == 3)
       text.insert(at, text.substr(at, random() % 8));
-      break;
-    }
   }
   return text;
 }
@@ -82,9 +73,8 @@ TEST(ToolsTest, FuzzedTextKeepsSplitTrimReplaceAndEnumerationsConsistent) {
     const auto other = fuzzInput(random, seeds).substr(0, 3);
 
     std::string rejoined = Tools::join(Tools::split(text, ','), ",");
-    if (!text.empty() && text.back() == ',') {
+    if (!text.empty() && text.back() == ',')
       rejoined += ',';
-    }
     ASSERT_EQ(rejoined, text);
     ASSERT_FALSE(Tools::split(text, other).empty());
     ASSERT_FALSE(Tools::splitTrim(text, other, " ").empty());
@@ -163,8 +153,7 @@ TEST(ToolsTest, FuzzedConfigurationFilesReadWithoutHarm) {
     // At most one element closes on a line, and each closing stores one entry.
     const auto xml = Tools::readXml(path);
     ASSERT_LE(xml.size(), lines);
-    for (const auto &entry : xml) {
+    for (const auto &entry : xml)
       ASSERT_FALSE(entry.first.empty());
-    }
   }
 }

@@ -4,6 +4,7 @@
 
 #include <gtest/gtest.h>
 
+#include <array>
 #include <climits>
 #include <clocale>
 #include <cmath>
@@ -15,7 +16,7 @@
 using namespace Corvane::Wavemill;
 using Corvane::Wavemill::Testing::thrown;
 
-TEST(ToolsTest, ParseFunctionsTakeTheLeadingNumberOrAnswerTheDefault) {
+TEST(ToolsTest, ParseFunctionsTakeTheLeadingNumberOrAnswerTheDefaultOrLeaveTheValueAlone) {
   EXPECT_EQ(Tools::parseInt32("", 7), 7);
   EXPECT_EQ(Tools::parseInt32("12345678901", 7), 7);
   EXPECT_EQ(Tools::parseInt32(" 42abc", 7), 42);
@@ -25,9 +26,8 @@ TEST(ToolsTest, ParseFunctionsTakeTheLeadingNumberOrAnswerTheDefault) {
   EXPECT_EQ(Tools::parseDouble("1e999", -1), -1);
   EXPECT_EQ(Tools::parseFloat("0.25", 0), 0.25F);
   EXPECT_EQ(Tools::parseFloat("1e39", 3), 3.0F);
-}
 
-TEST(ToolsTest, TryParseIntLeavesTheValueAloneOnFailure) {
+  // tryParse leaves the value alone when it fails.
   int value = 0;
   EXPECT_TRUE(Tools::tryParse("ff", value, 16));
   EXPECT_EQ(value, 255);
@@ -56,39 +56,35 @@ TEST(ToolsTest, TryParseDoubleRefusesWhatTheFilterRejectsAndPassesConversionFail
   EXPECT_EQ(thrown([&] { Tools::tryParse("1e999", value); }), "out_of_range: stod argument out of range");
 }
 
+// Each row: value, low, high, step and the result.
 TEST(ToolsTest, ClipFormsDifferInGridOriginAndDirection) {
   EXPECT_EQ(Tools::clip(-2.0F, -1.0F, 1.0F), -1.0F);
   EXPECT_EQ(Tools::clip(0.5F, -1.0F, 1.0F), 0.5F);
-  EXPECT_EQ(Tools::clip(7.0, 0.0, 10.0, 4.0), 8.0);
-  EXPECT_EQ(Tools::clip(-1.0, 0.0, 10.0, 4.0), 0.0);
-  EXPECT_EQ(Tools::clip(3.0, 1.0, 10.0, 4.0), 4.0);
-  EXPECT_EQ(Tools::clip(10.0, 0.0, 10.0, 6.0), 10.0);
-  EXPECT_EQ(Tools::clip(1.0, 0.5, 10.0, 4.0), 0.5);
-  EXPECT_EQ(Tools::clip(3.3, 0.0, 10.0, 0.0), 3.3);
-  EXPECT_EQ(Tools::clip(5, 1, 10, 4), 5);
-  EXPECT_EQ(Tools::clip(6, 1, 10, 4), 9);
-  EXPECT_EQ(Tools::clip(10, 1, 10, 4), 9);
-  EXPECT_EQ(Tools::clip(6, 1, 10, -2), 6);
-  EXPECT_EQ(Tools::clip(6, 1, 4, 4), 4);
-  EXPECT_EQ(Tools::clip(INT_MAX, INT_MIN, INT_MAX, INT_MAX), INT_MAX - 1);
+  // The double form takes the nearest multiple of the step counted from zero.
+  const std::array<double, 5> reals[] = {{7, 0, 10, 4, 8},   {-1, 0, 10, 4, 0},    {3, 1, 10, 4, 4},
+                                         {10, 0, 10, 6, 10}, {1, 0.5, 10, 4, 0.5}, {3.3, 0, 10, 0, 3.3}};
+  for (const auto &[value, low, high, step, result] : reals)
+    EXPECT_EQ(Tools::clip(value, low, high, step), result) << value << " " << low << " " << high << " " << step;
+  // The int form rounds up on the grid that starts at low, one step back above high.
+  const std::array<int, 5> integers[] = {{5, 1, 10, 4, 5},  {6, 1, 10, 4, 9},
+                                         {10, 1, 10, 4, 9}, {6, 1, 10, -2, 6},
+                                         {6, 1, 4, 4, 4},   {INT_MAX, INT_MIN, INT_MAX, INT_MAX, INT_MAX - 1}};
+  for (const auto &[value, low, high, step, result] : integers)
+    EXPECT_EQ(Tools::clip(value, low, high, step), result) << value << " " << low << " " << high << " " << step;
 }
 
 TEST(ToolsTest, RoundTakesHalvesAwayFromZeroAndStepsBackAboveHigh) {
-  EXPECT_EQ(Tools::round(9.9, 0.0, 10.0, 4.0), 8.0);
-  EXPECT_EQ(Tools::round(10.0, 0.0, 10.0, 4.0), 8.0);
-  EXPECT_EQ(Tools::round(2.0, 0.0, 10.0, 4.0), 4.0);
-  EXPECT_EQ(Tools::round(-2.0, -10.0, 10.0, 4.0), -4.0);
-  EXPECT_EQ(Tools::round(3.3, 0.0, 2.0, 5.0), 2.0);
-  EXPECT_EQ(Tools::round(5.0, 10.0, 0.0, 0.0), 0.0);
+  const std::array<double, 5> rows[] = {{9.9, 0, 10, 4, 8},   {10, 0, 10, 4, 8}, {2, 0, 10, 4, 4},
+                                        {-2, -10, 10, 4, -4}, {3.3, 0, 2, 5, 2}, {5, 10, 0, 0, 0}};
+  for (const auto &[value, low, high, step, result] : rows)
+    EXPECT_EQ(Tools::round(value, low, high, step), result) << value << " " << low << " " << high << " " << step;
 }
 
 TEST(ToolsTest, ToSingleAvoidsInfinitiesAndDenormals) {
-  EXPECT_EQ(Tools::toSingle(1e39), 1e38F);
-  EXPECT_EQ(Tools::toSingle(-1e39), -1e38F);
-  EXPECT_EQ(Tools::toSingle(1e-38), 0.0F);
-  EXPECT_EQ(Tools::toSingle(-1e-38), 0.0F);
-  EXPECT_EQ(Tools::toSingle(1e-37), 1e-37F);
-  EXPECT_EQ(Tools::toSingle(1.5), 1.5F);
+  const std::pair<double, float> rows[] = {{1e39, 1e38F},  {-1e39, -1e38F}, {1e-38, 0.0F},
+                                           {-1e-38, 0.0F}, {1e-37, 1e-37F}, {1.5, 1.5F}};
+  for (const auto &[value, single] : rows)
+    EXPECT_EQ(Tools::toSingle(value), single) << value;
   EXPECT_TRUE(std::isnan(Tools::toSingle(std::numeric_limits<double>::quiet_NaN())));
 }
 

@@ -15,6 +15,7 @@
 #include <fstream>
 #include <string>
 #include <thread>
+#include <utility>
 
 using namespace Corvane::Wavemill;
 using Testing::TempDir;
@@ -27,95 +28,84 @@ bool listed(int pid) {
   return std::find(ids.begin(), ids.end(), pid) != ids.end();
 }
 
-// Starts a shell that publishes its process id and then runs `script`; the id
-// is read back once the file is complete.
-int startShell(const TempDir &dir, const std::string &script, int timeoutInMS) {
-  const std::string pid = dir.path("pid");
-  EXPECT_EQ(Tools::startProcess("/bin/sh -c 'echo $$ > \"" + pid + ".new\"; mv \"" + pid + ".new\" \"" + pid + "\"; " +
-                                    script + "'",
-                                timeoutInMS),
-            0);
-  while (!fs::exists(pid)) // no time limit of its own: the test's time-out catches a lost shell
-    std::this_thread::sleep_for(std::chrono::milliseconds(5));
-  return std::stoi(Tools::readText(pid));
-}
+// A folder for the files the started programs write.
+class StartProcessTest : public ::testing::Test {
+protected:
+  // Starts a shell that publishes its process id and then runs `script`; the
+  // id is read back once the file is complete.
+  int startShell(const std::string &script, int timeoutInMS) {
+    const std::string pid = dir.path("pid");
+    EXPECT_EQ(Tools::startProcess("/bin/sh -c 'echo $$ > \"" + pid + ".new\"; mv \"" + pid + ".new\" \"" + pid +
+                                      "\"; " + script + "'",
+                                  timeoutInMS),
+              0);
+    while (!fs::exists(pid)) // no time limit of its own: the test's time-out catches a lost shell
+      std::this_thread::sleep_for(std::chrono::milliseconds(5));
+    return std::stoi(Tools::readText(pid));
+  }
+  TempDir dir;
+};
 
 } // namespace
 
-TEST(ToolsTest, StartProcessFailsOnlyWhenTheProgramCannotStart) {
-  TempDir dir;
+TEST_F(StartProcessTest, FailsOnlyWhenTheProgramCannotStart) {
   const std::string script = dir.path("not-executable");
-  std::ofstream(script) << "#!/bin/sh\n";
+  Tools::writeText(script, "#!/bin/sh\n");
   fs::permissions(script, fs::perms::owner_read | fs::perms::owner_write);
-  const struct {
-    std::string commandLine;
-    int result;
-  } rows[] = {
-      {"/bin/sh -c 'exit 127'", 0}, // the exit codes a shell gives for its own start failures
-      {"/bin/sh -c 'exit 126'", 0},
-      {"/bin/sh -c 'kill -9 $$'", 0},
-      {"wavemill-no-such-program", ENOENT},
-      {"'" + dir.path("absent") + "' argument", ENOENT},
-      {"exit 0", ENOENT}, // no shell runs, so its built-in commands are no programs
-      {"'" + script + "'", EACCES},
-      {"", EINVAL},
-      {" \t\n ", EINVAL},
-      {"/bin/sh -c 'exit 0", EINVAL},
-      {"\"/bin/true", EINVAL},
-  };
-  for (const auto &row : rows) {
-    SCOPED_TRACE(row.commandLine);
-    EXPECT_EQ(Tools::startProcess(row.commandLine, -1), row.result);
-  }
+  // Exit codes 126 and 127 are what a shell gives for its own start failures;
+  // "exit 0" fails as no shell runs, so its built-in commands are no programs.
+  const std::pair<std::string, int> rows[] = {{"/bin/sh -c 'exit 127'", 0},
+                                              {"/bin/sh -c 'exit 126'", 0},
+                                              {"/bin/sh -c 'kill -9 $$'", 0},
+                                              {"wavemill-no-such-program", ENOENT},
+                                              {"'" + dir.path("absent") + "' argument", ENOENT},
+                                              {"exit 0", ENOENT},
+                                              {"'" + script + "'", EACCES},
+                                              {"", EINVAL},
+                                              {" \t\n ", EINVAL},
+                                              {"/bin/sh -c 'exit 0", EINVAL},
+                                              {"\"/bin/true", EINVAL}};
+  for (const auto &[commandLine, result] : rows)
+    EXPECT_EQ(Tools::startProcess(commandLine, -1), result) << commandLine;
 }
 
-TEST(ToolsTest, StartProcessSplitsWordsLikeAShellAndExpandsNothing) {
-  TempDir dir;
+TEST_F(StartProcessTest, SplitsWordsLikeAShellAndExpandsNothing) {
   const std::string out = dir.path("words");
   // The shell is only the started program here: it writes each word it was
   // given in brackets, so that blanks and empty words show.
   const std::string printWords = "/bin/sh -c 'printf \"[%s]\" \"$@\" > \"" + out + "\"' sh ";
-  const struct {
-    const char *words;
-    const char *expected;
-  } rows[] = {
-      {"plain  words\ttab\nline", "[plain][words][tab][line]"},
-      {R"('x  y' "p q")", "[x  y][p q]"},
-      {R"($HOME * a>b | c;d)", "[$HOME][*][a>b][|][c;d]"},
-      {R"("a\"b\\c\$d\`e\xf")", R"([a"b\c$d`e\xf])"},
-      {R"(a\ b \'c\" \\ \x)", R"([a b]['c"][\][x])"},
-      {R"('a\b "c" $d')", R"([a\b "c" $d])"},
-      {R"('' "" x""y'z')", "[][][xyz]"},
-      {"a\\\nb \"c\\\nd\"", "[ab][cd]"},
-  };
-  for (const auto &row : rows) {
-    SCOPED_TRACE(row.words);
+  const std::pair<const char *, const char *> rows[] = {{"plain  words\ttab\nline", "[plain][words][tab][line]"},
+                                                        {R"('x  y' "p q")", "[x  y][p q]"},
+                                                        {R"($HOME * a>b | c;d)", "[$HOME][*][a>b][|][c;d]"},
+                                                        {R"("a\"b\\c\$d\`e\xf")", R"([a"b\c$d`e\xf])"},
+                                                        {R"(a\ b \'c\" \\ \x)", R"([a b]['c"][\][x])"},
+                                                        {R"('a\b "c" $d')", R"([a\b "c" $d])"},
+                                                        {R"('' "" x""y'z')", "[][][xyz]"},
+                                                        {"a\\\nb \"c\\\nd\"", "[ab][cd]"}};
+  for (const auto &[words, expected] : rows) {
     fs::remove(out);
-    ASSERT_EQ(Tools::startProcess(printWords + row.words, -1), 0);
-    EXPECT_EQ(Tools::readText(out), row.expected); // written before startProcess returned
+    ASSERT_EQ(Tools::startProcess(printWords + words, -1), 0) << words;
+    EXPECT_EQ(Tools::readText(out), expected) << words; // written before startProcess returned
   }
 }
 
-TEST(ToolsTest, ProgramThatOutlastsTheWaitCountsAsStartedAndIsReapedOnceEnded) {
-  TempDir dir;
+TEST_F(StartProcessTest, AProgramThatOutlastsTheWaitCountsAsStartedAndIsReapedOnceEnded) {
   const std::string gate = dir.path("gate");
   // The shell cannot end before the gate exists, so the call returns on its
   // time-out; the shell goes on, ending once let through.
-  const int pid = startShell(dir, "while [ ! -e \"" + gate + "\" ]; do sleep 0.01; done", 20);
+  const int pid = startShell("while [ ! -e \"" + gate + "\" ]; do sleep 0.01; done", 20);
   EXPECT_TRUE(Tools::isRunning(pid));
-  std::ofstream(gate).put('x');
+  Tools::writeText(gate, "x");
   while (Tools::isRunning(pid)) // no time limit of its own: the test's time-out catches a child seen running forever
     std::this_thread::sleep_for(std::chrono::milliseconds(5));
   EXPECT_FALSE(listed(pid)); // reaped, not left as a zombie
 }
 
-TEST(ToolsTest, KillProcessEndsAChildThatIsRunningListedAndOurs) {
-  TempDir dir;
-  const int pid = startShell(dir, "exec sleep 30", 0);
+TEST_F(StartProcessTest, KillProcessEndsAChildThatIsRunningListedAndOurs) {
+  const int pid = startShell("exec sleep 30", 0);
   EXPECT_TRUE(Tools::isRunning(pid));
   EXPECT_TRUE(listed(pid));
   EXPECT_EQ(Tools::getParentProcessId(pid), Tools::getCurrentProcessId());
-
   EXPECT_TRUE(Tools::killProcess(pid, 1));
   EXPECT_FALSE(Tools::isRunning(pid));
   EXPECT_FALSE(listed(pid)); // reaped, not left as a zombie

@@ -17,7 +17,7 @@ using Pieces = std::vector<std::string>;
 
 } // namespace
 
-TEST(ToolsTest, SplitKeepsLeadingAndInnerEmptyPiecesButNoTrailingOne) {
+TEST(ToolsTest, SplitKeepsLeadingAndInnerEmptyPiecesTrimOnlyTheEndsAndReplaceNeverRescans) {
   EXPECT_EQ(Tools::split("", ','), Pieces{""});
   EXPECT_EQ(Tools::split(",", ','), Pieces{""});
   EXPECT_EQ(Tools::split("a,b,", ','), (Pieces{"a", "b"}));
@@ -26,9 +26,6 @@ TEST(ToolsTest, SplitKeepsLeadingAndInnerEmptyPiecesButNoTrailingOne) {
   EXPECT_EQ(Tools::split("a;b,c", ",;"), (Pieces{"a", "b", "c"}));
   EXPECT_EQ(Tools::splitTrim(" a , b ,", ',', ' '), (Pieces{"a", "b"}));
   EXPECT_EQ(Tools::splitTrim("\"x\" ;\t y", ";", " \t\""), (Pieces{"x", "y"}));
-}
-
-TEST(ToolsTest, TrimAndReplaceWorkOnlyWhereTheyShould) {
   // Trimming removes members of the set only at the chosen ends.
   EXPECT_EQ(Tools::trim("   ", ' '), "");
   EXPECT_EQ(Tools::trim(" a ", ""), " a ");
@@ -62,16 +59,14 @@ TEST(ToolsTest, CaseQuotingJoiningAndFilteringWorkOnBytes) {
   EXPECT_EQ(target, std::string("xyz\0w", 5));
 }
 
-TEST(ToolsTest, PadLeftClipKeepsTheRightHandEndAtExactlyTheLength) {
+TEST(ToolsTest, PadLeftClipKeepsTheRightHandEndAtExactlyTheLengthAndBitStringsTakeOnlyZerosAndOnes) {
   std::string digits = "12345", one = "7";
   EXPECT_EQ(Tools::padLeftClip(digits, 3), "345");
   EXPECT_EQ(digits, "12345");
   EXPECT_EQ(Tools::padLeftClip(one, 3), "007");
   EXPECT_EQ(Tools::padLeftClip(one, 0), "");
   EXPECT_EQ(thrown([&] { Tools::padLeftClip(one, UINT64_MAX); }), "invalid_argument: length");
-}
 
-TEST(ToolsTest, BitStringsConvertOnlyZerosAndOnes) {
   EXPECT_EQ(Tools::formatBitsWithLength("x1", 2), "10");
   EXPECT_EQ(Tools::formatBitsWithLength("x1111", 2), "10");
   EXPECT_EQ(Tools::formatBitsWithLength("1", -3), "");
