@@ -1,7 +1,7 @@
 #include "wavemill/waveform/Exporter2.h"
 
 #include "support/TempDir.h"
-#include "support/WaveformFile.h"
+#include "support/WaveformFiles.h"
 
 #include <gtest/gtest.h>
 
@@ -17,8 +17,8 @@ namespace {
 
 // Exporter2 writes whole waveforms through setData; the streaming half
 // belongs to its subclasses.
-class WholeExporter : public Exporter2 {
-public:
+struct WholeExporter : Exporter2 {
+  using Exporter2::convertData;
   using Exporter2::Exporter2;
   bool start(int64_t, bool) override { return false; }
   bool start(bool) override { return false; }
@@ -27,8 +27,6 @@ public:
   bool streamiq(unsigned char *, int) override { return false; }
   bool streammarker(unsigned char *, int) override { return false; }
 };
-
-std::size_t pad(std::size_t n) { return (n + 15) / 16 * 16; }
 
 Bytes header(int n) {
   Bytes h(static_cast<std::size_t>(n));
@@ -62,42 +60,39 @@ TEST(Exporter2Test, FileHoldsHeadHeaderIqAndMarkerPackagesByteForByte) {
   for (const Row &row : rows) {
     SCOPED_TRACE("header " + std::to_string(row.headerLen) + ", samples " + std::to_string(row.samples));
     TempDir dir;
-    Bytes h = header(row.headerLen);
-    std::vector<double> i(static_cast<std::size_t>(row.samples)), q(i.size());
-    Bytes markers(i.size() * static_cast<std::size_t>(row.markerCount));
-    for (std::size_t s = 0; s < i.size(); ++s) {
+    const Bytes h = header(row.headerLen);
+    const auto n = static_cast<std::size_t>(row.samples), channels = static_cast<std::size_t>(row.markerCount);
+    std::vector<double> i(n), q(n);
+    Bytes markers(n * channels), iq, packed(n);
+    double peak = 0;
+    for (std::size_t s = 0; s < n; ++s) {
       i[s] = std::sin(0.1 * static_cast<double>(s)) * 0.3;
       q[s] = std::cos(0.1 * static_cast<double>(s)) * 0.2;
+      peak = std::max({peak, std::fabs(i[s]), std::fabs(q[s])});
     }
     for (std::size_t k = 0; k < markers.size(); ++k) {
       markers[k] = static_cast<unsigned char>(k % 3 == 0 ? 0 : k);
-    }
-    const std::time_t before = std::time(nullptr);
-    WholeExporter exporter(dir.path("w.wv"), h.data(), row.headerLen);
-    EXPECT_TRUE(exporter.setData(i.data(), q.data(), markers.data(), row.samples, row.markerCount));
-    const std::time_t after = std::time(nullptr);
-    const WaveformFile file = openWaveform(dir.path("w.wv"));
-    const auto n = static_cast<std::size_t>(row.samples);
-    ASSERT_EQ(file.size, 32 + pad(8 + h.size() - 16) + pad(8 + 4 * n) + pad(8 + n));
-    EXPECT_EQ(Bytes(file.head.begin(), file.head.begin() + 8), Bytes(h.begin(), h.begin() + 8));
-    EXPECT_EQ(Bytes(file.head.begin() + 16, file.head.begin() + 24), Bytes(h.begin() + 8, h.begin() + 16));
-    EXPECT_TRUE(saltOfTime(&file.head[8], before, after));
-    EXPECT_TRUE(saltOfTime(&file.head[24], before, after));
-    ASSERT_EQ(file.packages.size(), 3u);
-    Bytes iq, packed(n);
-    double peak = 0;
-    for (std::size_t s = 0; s < n; ++s) {
-      peak = std::max({peak, std::fabs(i[s]), std::fabs(q[s])});
     }
     for (std::size_t s = 0; s < n; ++s) {
       for (double v : {i[s] / peak, q[s] / peak}) {
         const auto word = static_cast<std::uint16_t>(static_cast<std::int16_t>(std::lround(v * 32767.0)));
         iq.insert(iq.end(), {static_cast<unsigned char>(word >> 8), static_cast<unsigned char>(word)});
       }
-      for (std::size_t c = 0; c < 4 && c < static_cast<std::size_t>(row.markerCount); ++c) {
-        packed[s] |= markers[s * static_cast<std::size_t>(row.markerCount) + c] != 0 ? 1 << c : 0;
+      for (std::size_t c = 0; c < 4 && c < channels; ++c) {
+        packed[s] |= markers[s * channels + c] != 0 ? 1 << c : 0;
       }
     }
+    const std::time_t before = std::time(nullptr);
+    WholeExporter exporter(dir.path("w.wv"), const_cast<unsigned char *>(h.data()), row.headerLen);
+    EXPECT_TRUE(exporter.setData(i.data(), q.data(), markers.data(), row.samples, row.markerCount));
+    const std::time_t after = std::time(nullptr);
+    const WaveformFile file = openWaveform(dir.path("w.wv"));
+    ASSERT_EQ(file.size, 32 + pad(8 + h.size() - 16) + pad(8 + 4 * n) + pad(8 + n));
+    EXPECT_EQ(Bytes(file.head.begin(), file.head.begin() + 8), Bytes(h.begin(), h.begin() + 8));
+    EXPECT_EQ(Bytes(file.head.begin() + 16, file.head.begin() + 24), Bytes(h.begin() + 8, h.begin() + 16));
+    EXPECT_TRUE(saltOfTime(&file.head[8], before, after));
+    EXPECT_TRUE(saltOfTime(&file.head[24], before, after));
+    ASSERT_EQ(file.packages.size(), 3u);
     const Bytes bodies[] = {Bytes(h.begin() + 16, h.end()), iq, packed};
     for (std::uint32_t tag = 1; tag <= 3; ++tag) {
       const Package &p = file.packages[tag - 1];
@@ -121,6 +116,11 @@ TEST(Exporter2Test, SamplesRoundToSixteenBitsAndBadInputIsRefused) {
   EXPECT_FALSE(exporter.setData(i, q, nullptr, -1, 0));
   EXPECT_FALSE(exporter.setData(i, q, nullptr, 1 << 29, 0));
   EXPECT_EQ(std::filesystem::file_size(dir.path("w.wv")), 0u);
+  // The raw form, which the streaming exporters fill, takes bytes as they are.
+  EXPECT_TRUE(exporter.convertData(markers, nullptr, 2));
+  EXPECT_FALSE(exporter.convertData(nullptr, markers, 2));
+  EXPECT_FALSE(exporter.convertData(markers, markers, -1));
+  EXPECT_FALSE(exporter.convertData(markers, markers, 1 << 29));
 
   EXPECT_TRUE(exporter.setData(i, q, markers, 6, 3));
   const Bytes written = readBytes(dir.path("w.wv"));
@@ -139,21 +139,28 @@ TEST(Exporter2Test, SamplesRoundToSixteenBitsAndBadInputIsRefused) {
   EXPECT_EQ(openWaveform(dir.path("zero.wv")).packages[1].body, Bytes(8, 0));
 }
 
-TEST(Exporter2Test, UnwritableTargetLeavesNoFileAndShortHeaderIsPadded) {
+TEST(Exporter2Test, AFailedWriteIsReportedAndLeavesNoFileAndShortHeaderIsPadded) {
   TempDir dir;
   Bytes h = header(16);
-  double v[1] = {1.0};
-  for (const std::string &target : {dir.path("missing/w.wv"), dir.root()}) {
-    SCOPED_TRACE(target);
+  std::vector<double> v(52'500, 1.0);
+  // A full device takes the file head but no data. 52500 samples make a
+  // file a little over the 256 KiB stdio buffer: one write fails and the
+  // closing flush, with nothing left to write, succeeds; 1 sample fails
+  // only in the closing flush.
+  const std::pair<std::string, int> rows[] = {
+      {dir.path("missing/w.wv"), 1}, {dir.root(), 1}, {"/dev/full", 1}, {"/dev/full", 52'500}};
+  for (const auto &[target, samples] : rows) {
+    SCOPED_TRACE(target + ", samples " + std::to_string(samples));
     WholeExporter exporter(target, h.data(), 16);
+    EXPECT_EQ(exporter.failed(), target != "/dev/full");
+    EXPECT_TRUE(exporter.setData(v.data(), v.data(), nullptr, samples, 0));
     EXPECT_TRUE(exporter.failed());
-    EXPECT_TRUE(exporter.setData(v, v, nullptr, 1, 0));
     EXPECT_FALSE(std::filesystem::exists(dir.path("missing")));
   }
   EXPECT_TRUE(std::filesystem::is_directory(dir.root()));
 
   WholeExporter shortHeader(dir.path("s.wv"), h.data(), 5);
-  EXPECT_TRUE(shortHeader.setData(v, v, nullptr, 1, 0));
+  EXPECT_TRUE(shortHeader.setData(v.data(), v.data(), nullptr, 1, 0));
   const WaveformFile file = openWaveform(dir.path("s.wv"));
   EXPECT_EQ(Bytes(file.head.begin(), file.head.begin() + 8), Bytes({0xa0, 0xa1, 0xa2, 0xa3, 0xa4, 0, 0, 0}));
   ASSERT_EQ(file.packages.size(), 3u);

@@ -1,4 +1,3 @@
-#include "wavemill/waveform/Exporter2.h"
 #include "wavemill/waveform/StreamingImporter2.h"
 
 #include "support/TempDir.h"
@@ -6,7 +5,8 @@
 
 #include <gtest/gtest.h>
 
-#include <cmath>
+#include <algorithm>
+#include <cstring>
 #include <functional>
 #include <string>
 
@@ -15,74 +15,85 @@ using namespace Corvane::Wavemill::Testing;
 
 namespace {
 
-// The whole-file form of the exporter: `setData` writes head, header, IQ
-// and markers. The streaming operations are not used here.
-struct WholeFileExporter : Exporter2 {
-  using Exporter2::Exporter2;
-  bool start(int64_t, bool) override { return false; }
-  bool start(bool) override { return false; }
-  void stop() override {}
-  bool stream(unsigned char *, unsigned char *, int, bool) override { return false; }
-  bool streamiq(unsigned char *, int) override { return false; }
-  bool streammarker(unsigned char *, int) override { return false; }
-};
-
 struct Importer : streamingImporter2 {
   using Importer2::lastError;
 };
 
+// Holds the whole file in memory, as a subclass may: one pass of the
+// decrypter over all its bytes, after which the base getters serve it.
+struct WholeImporter : Importer2 {
+  int load(const std::string &path) {
+    Bytes file = readBytes(path);
+    unsigned char key[16];
+    std::memcpy(key, fixedFileKey, 16);
+    EXPECT_TRUE(openInit(widePath(path).c_str()));
+    const int used = runDecrypter(file.data(), static_cast<int>(file.size()), key);
+    flush();
+    saveDecryptedData(); // no prefix follows the last package to store it
+    return used;
+  }
+};
+
+// 40 header bytes, 1000 samples and their markers.
+struct ImporterTest : testing::Test {
+  TempDir dir;
+  const Bytes header = patternBytes(40, 22), iq = patternBytes(4000, 23), markers = patternBytes(1000, 24);
+  const std::string file = dir.path("w.wv");
+  void SetUp() override { writeBytes(file, encryptWaveform(plainWaveform(header, iq, &markers))); }
+};
+
 } // namespace
 
-TEST(ImporterTest, SamplesAndMarkersOfTheWholeFileExporterReadBackScaledAndPacked) {
-  TempDir dir;
-  auto header = patternBytes(40, 21);
-  const int samples = 1000;
-  std::vector<double> i(samples), q(samples);
-  std::vector<unsigned char> markers(2 * samples);
-  for (int n = 0; n < samples; ++n) {
-    i[n] = 0.25 * std::sin(n * 0.01);
-    q[n] = 0.5 * std::cos(n * 0.013); // peak 0.5 at n = 0: full scale for both
-    markers[2 * n] = n % 3 == 0;
-    markers[2 * n + 1] = n % 5 == 0 ? 7 : 0;
-  }
-  WholeFileExporter exporter(dir.path("w.wv"), header.data(), 40);
-  ASSERT_TRUE(exporter.setData(i.data(), q.data(), markers.data(), samples, 2));
-
+TEST_F(ImporterTest, SamplesReadBackAsBigEndianSixteenBitValuesOverFullScale) {
   Importer importer;
-  ASSERT_TRUE(importer.Open(widePath(dir.path("w.wv")).c_str()));
+  ASSERT_TRUE(importer.Open(widePath(file).c_str()));
   Bytes head(40);
   ASSERT_EQ(importer.GetHeader(head.data(), 40), 40);
   EXPECT_EQ(head, header);
-  ASSERT_EQ(importer.GetIQDataLen(), samples);
-  std::vector<double> gotI(samples), gotQ(samples);
-  for (int at = 0; at < samples;) { // 7 samples are 28 bytes: whole reads
-    const int got = importer.GetIQData(gotI.data() + at, gotQ.data() + at, std::min(7, samples - at));
+  ASSERT_EQ(importer.GetIQDataLen(), 1000);
+  std::vector<double> i(1000), q(1000);
+  for (int at = 0; at < 1000;) { // 7 samples are 28 bytes: whole reads
+    const int got = importer.GetIQData(i.data() + at, q.data() + at, std::min(7, 1000 - at));
     ASSERT_GT(got, 0);
     at += got;
   }
-  for (int n = 0; n < samples; ++n) {
-    ASSERT_NEAR(gotI[n], i[n] / 0.5, 0.5 / 32767 + 1e-12) << n;
-    ASSERT_NEAR(gotQ[n], q[n] / 0.5, 0.5 / 32767 + 1e-12) << n;
-  }
-  EXPECT_EQ(gotQ[0], 1.0);
-  Bytes packed(samples);
-  ASSERT_EQ(importer.GetMarkers(packed.data(), samples), samples);
-  for (int n = 0; n < samples; ++n) {
-    ASSERT_EQ(packed[n], (n % 3 == 0 ? 1 : 0) | (n % 5 == 0 ? 2 : 0)) << n;
+  for (std::size_t n = 0; n < 1000; ++n) {
+    ASSERT_EQ(i[n], static_cast<std::int16_t>(iq[4 * n] << 8 | iq[4 * n + 1]) / 32767.0) << n;
+    ASSERT_EQ(q[n], static_cast<std::int16_t>(iq[4 * n + 2] << 8 | iq[4 * n + 3]) / 32767.0) << n;
   }
 }
 
-TEST(ImporterTest, EveryRefusalAnswersItsResultAndMessage) {
-  TempDir dir;
-  auto header = patternBytes(40, 22);
-  const auto iq = patternBytes(4000, 23);
-  const auto markers = patternBytes(1000, 24);
-  writeBytes(dir.path("w.wv"), encryptWaveform(plainWaveform(header, iq, &markers)));
-  const auto path = widePath(dir.path("w.wv"));
+TEST_F(ImporterTest, AFileDecryptedInOnePassIsServedFromMemoryWithMarkersUnpackedToBits) {
+  WholeImporter importer;
+  EXPECT_EQ(importer.load(file), static_cast<int>(readBytes(file).size())); // far more than the staging area
+  ASSERT_EQ(importer.GetHeaderLength(), 40);
+  Bytes got(4004, 0xee);
+  EXPECT_EQ(importer.GetHeader(got.data(), 40), 40);
+  EXPECT_TRUE(std::equal(header.begin(), header.end(), got.begin()));
+  ASSERT_EQ(importer.GetIQDataLen(), 1000);
+  EXPECT_EQ(importer.GetRawIQData(got.data(), 4000), 4000);
+  EXPECT_TRUE(std::equal(iq.begin(), iq.end(), got.begin()));
+  EXPECT_EQ(importer.GetDataPtr(got.data(), 0), 0);
+  EXPECT_EQ(importer.GetDataPtr(got.data(), 5000), 4000);
+  EXPECT_EQ(importer.GetRawMarkers(got.data(), 1000), 1000);
+  EXPECT_TRUE(std::equal(markers.begin(), markers.end(), got.begin()));
+  std::fill(got.begin(), got.end(), 0xee);
+  EXPECT_EQ(importer.GetMarkers(got.data(), 1000), 1000);
+  for (std::size_t n = 0; n < 4000; ++n) {
+    ASSERT_EQ(got[n], (markers[n / 4] >> (n % 4)) & 1) << n;
+  }
+  EXPECT_EQ(Bytes(got.begin() + 4000, got.end()), Bytes(4, 0xee)); // nothing past the 4 bytes a sample
+}
+
+TEST_F(ImporterTest, EveryRefusalAnswersItsResultAndMessage) {
+  const auto path = widePath(file);
   const std::string invalid = "Error: Invalid Waveform data and waveform information";
   unsigned char buffer[4096];
   double values[1000];
-
+  auto markersPerSample = [](Importer &m) {
+    int count = -5;
+    return m.GetNMarker(count) ? count : -5;
+  };
   struct Row {
     const char *name;
     bool open;
@@ -92,12 +103,7 @@ TEST(ImporterTest, EveryRefusalAnswersItsResultAndMessage) {
   } rows[] = {
       {"header length before Open", false, [](Importer &m) { return m.GetHeaderLength(); }, -1, invalid},
       {"samples before Open", false, [](Importer &m) { return m.GetIQDataLen(); }, 0, invalid},
-      {"markers per sample before Open", false,
-       [](Importer &m) {
-         int count = -5;
-         return m.GetNMarker(count) ? count : -5;
-       },
-       -5, invalid},
+      {"markers per sample before Open", false, markersPerSample, -5, invalid},
       {"IQ before Open", false, [&](Importer &m) { return m.GetRawIQData(buffer, 16); }, 0, invalid},
       {"header before Open", false, [&](Importer &m) { return m.GetHeader(buffer, 40); }, 0, invalid},
       {"the base class opens nothing", false, [&](Importer &m) { return m.Importer2::Open(path.c_str(), buffer); }, 0,
@@ -110,17 +116,14 @@ TEST(ImporterTest, EveryRefusalAnswersItsResultAndMessage) {
        "Error: Incorrect buffer size: need buffer size 4000, input buffer size 3996"},
       {"decoded IQ of the wrong count", true, [&](Importer &m) { return m.Importer2::GetIQData(values, values, 999); },
        0, "Error: Incorrect buffer size: need buffer size 1000, input buffer size 999"},
+      {"decoded IQ of the right count, none held", true,
+       [&](Importer &m) { return m.Importer2::GetIQData(values, values, 1000); }, 0, ""},
       {"unpacked markers of the wrong count", true, [&](Importer &m) { return m.Importer2::GetMarkers(buffer, 1001); },
        0, "Error: Incorrect number of marker samplea: total samples is 1000 but requested is 1001"},
       {"packed markers of the wrong count", true, [&](Importer &m) { return m.GetRawMarkers(buffer, 7); }, 0,
        "Error: Incorrect number of marker sample: total samples 1000 requested 7"},
       {"packed markers freed by Open", true, [&](Importer &m) { return m.GetRawMarkers(buffer, 1000); }, 0, ""},
-      {"markers per sample once open", true,
-       [](Importer &m) {
-         int count = 0;
-         return m.GetNMarker(count) ? count : -5;
-       },
-       4, ""},
+      {"markers per sample once open", true, markersPerSample, 4, ""},
   };
   for (const auto &row : rows) {
     SCOPED_TRACE(row.name);

@@ -1,7 +1,8 @@
 #include "wavemill/waveform/StreamingExporter2.h"
+#include "wavemill/waveform/StreamingImporter2.h"
 
 #include "support/TempDir.h"
-#include "support/WaveformFile.h"
+#include "support/WaveformFiles.h"
 
 #include <gtest/gtest.h>
 #include <openssl/evp.h>
@@ -17,42 +18,36 @@ namespace fs = std::filesystem;
 
 namespace {
 
-Bytes noise(std::size_t n, unsigned seed) {
-  Bytes b(n);
-  for (auto &x : b) {
-    seed = seed * 1103515245u + 12345u;
-    x = static_cast<unsigned char>(seed >> 16);
-  }
-  return b;
-}
-
-std::size_t pad(std::size_t n) { return (n + 15) / 16 * 16; }
-
 enum class Feed { Stream, Pairs, FloatPairs };
 
-// Writes `samples` samples of IQ and markers in the chunk sizes given (the
-// last repeated), and returns the IQ and marker bytes sent.
-std::pair<Bytes, Bytes> exportInChunks(const std::string &path, Feed feed, int samples, std::vector<int> chunks) {
-  Bytes h = noise(40, 1);
-  std::unique_ptr<Exporter2> exporter;
-  if (feed == Feed::FloatPairs) {
-    exporter = std::make_unique<streamingFloatExporter2>(path, h.data(), 40);
-  } else {
-    exporter = std::make_unique<streamingExporter2>(path, h.data(), 40);
+struct Exported {
+  Bytes header = patternBytes(200, 51), iq, markers;
+};
+
+std::unique_ptr<Exporter2> exporterFor(bool floating, const std::string &path, Bytes &header, int headerLen) {
+  if (floating) {
+    return std::make_unique<streamingFloatExporter2>(path, header.data(), headerLen);
   }
-  const std::size_t width = feed == Feed::FloatPairs ? 8 : 4;
-  Bytes iq = noise(width * static_cast<std::size_t>(samples), 2);
-  Bytes markers = noise(static_cast<std::size_t>(samples), 3);
+  return std::make_unique<streamingExporter2>(path, header.data(), headerLen);
+}
+
+// Writes `samples` samples of IQ and markers in chunks of the sizes given
+// (the last one repeated): through stream(), or streamiq() and
+// streammarker() in pairs and then stop().
+Exported exportInChunks(const std::string &path, Feed feed, int samples, const std::vector<int> &chunks) {
+  Exported out;
+  const std::size_t width = feed == Feed::FloatPairs ? 8 : 4, total = static_cast<std::size_t>(samples);
+  out.iq = patternBytes(width * total, 52);
+  out.markers = patternBytes(total, 53);
+  auto exporter = exporterFor(feed == Feed::FloatPairs, path, out.header, 200);
   EXPECT_TRUE(exporter->start(samples, true));
-  for (std::size_t at = 0, k = 0; at < markers.size(); ++k) {
-    const auto n =
-        std::min<std::size_t>(static_cast<std::size_t>(chunks[std::min(k, chunks.size() - 1)]), markers.size() - at);
-    const bool last = at + n == markers.size();
+  for (std::size_t at = 0, k = 0; at < total; ++k) {
+    const auto n = std::min<std::size_t>(static_cast<std::size_t>(chunks[std::min(k, chunks.size() - 1)]), total - at);
     if (feed == Feed::Stream) {
-      EXPECT_TRUE(exporter->stream(&iq[at * 4], &markers[at], static_cast<int>(n), last));
+      EXPECT_TRUE(exporter->stream(&out.iq[at * 4], &out.markers[at], static_cast<int>(n), at + n == total));
     } else {
-      EXPECT_TRUE(exporter->streamiq(&iq[at * width], static_cast<int>(n * width)));
-      EXPECT_TRUE(exporter->streammarker(&markers[at], static_cast<int>(n)));
+      EXPECT_TRUE(exporter->streamiq(&out.iq[at * width], static_cast<int>(n * width)));
+      EXPECT_TRUE(exporter->streammarker(&out.markers[at], static_cast<int>(n)));
     }
     at += n;
   }
@@ -60,15 +55,16 @@ std::pair<Bytes, Bytes> exportInChunks(const std::string &path, Feed feed, int s
     exporter->stop();
   }
   EXPECT_FALSE(exporter->failed());
-  return {iq, markers};
+  return out;
 }
 
-void expectPackages(const WaveformFile &file, std::uint32_t iqTag, const Bytes &iq, const Bytes &markers) {
-  const Bytes h = noise(40, 1);
-  ASSERT_EQ(file.size, 32 + pad(8 + 24) + pad(8 + iq.size()) + pad(8 + markers.size()));
+void expectPackages(const WaveformFile &file, std::uint32_t iqTag, const Exported &sent) {
+  const Bytes &h = sent.header;
+  ASSERT_EQ(file.size, 32 + pad(8 + h.size() - 16) + pad(8 + sent.iq.size()) + pad(8 + sent.markers.size()));
   ASSERT_EQ(file.packages.size(), 3u);
+  EXPECT_EQ(Bytes(file.head.begin(), file.head.begin() + 8), Bytes(h.begin(), h.begin() + 8));
   const std::uint32_t tags[] = {1, iqTag, 3};
-  const Bytes bodies[] = {Bytes(h.begin() + 16, h.end()), iq, markers};
+  const Bytes bodies[] = {Bytes(h.begin() + 16, h.end()), sent.iq, sent.markers};
   for (int k = 0; k < 3; ++k) {
     EXPECT_EQ(file.packages[k].tag, tags[k]);
     EXPECT_EQ(file.packages[k].length, bodies[k].size());
@@ -77,42 +73,91 @@ void expectPackages(const WaveformFile &file, std::uint32_t iqTag, const Bytes &
   }
 }
 
+// Reads one channel of a file, `piece` bytes at a time, up to `total`.
+struct Reader {
+  std::function<int(unsigned char *, int)> read;
+  int piece;
+  std::size_t total;
+  Bytes got{};
+  // False when the channel is done. A read that the kept surplus serves
+  // alone answers 0 but has delivered its bytes, as a caller counting the
+  // samples knows.
+  bool step() {
+    const auto want = static_cast<int>(std::min<std::size_t>(static_cast<std::size_t>(piece), total - got.size()));
+    if (want == 0) {
+      return false;
+    }
+    Bytes buffer(static_cast<std::size_t>(want));
+    const int n = read(buffer.data(), want);
+    if (n == 0 && want >= 16) {
+      return false;
+    }
+    got.insert(got.end(), buffer.begin(), buffer.begin() + (n > 0 ? n : want));
+    return true;
+  }
+};
+
 } // namespace
 
-TEST(StreamingExporterTest, ChunksOfAnySizeJoinIntoOnePackageEach) {
+TEST(StreamingExporterTest, ChunksOfAnySizeJoinIntoOnePackageEachAndReadBackPiecewise) {
+  constexpr int mebi = (1 << 20) / 4; // samples of 1 MiB of 16-bit IQ
   struct Row {
     const char *name;
     Feed feed;
     int samples;
     std::vector<int> chunks;
-  } rows[] = {{"one chunk, first and last", Feed::Stream, 5, {5}},
-              {"30, 30, 40 hold back 8 bytes once", Feed::Stream, 100, {30, 30, 40}},
-              {"chunks of 1 sample", Feed::Stream, 13, {1}},
-              {"pairs of 7 samples", Feed::Pairs, 50, {7}},
-              {"chunks of 1 MiB", Feed::Stream, 655360, {262144}},
-              {"float pairs of 7 samples", Feed::FloatPairs, 20, {7}},
-              {"float pairs of 1 sample", Feed::FloatPairs, 3, {1}}};
+    int piece; // bytes per read
+  } rows[] = {{"one chunk, first and last", Feed::Stream, 5, {5}, 28},
+              {"30, 30, 40 hold back 8 bytes once", Feed::Stream, 100, {30, 30, 40}, 60},
+              {"chunks of 1 sample", Feed::Stream, 300, {1}, 28},
+              {"chunks of 7 samples", Feed::Stream, 1'000, {7}, 60},
+              {"pairs of 7 samples", Feed::Pairs, 50, {7}, 40},
+              {"float pairs of 1 sample", Feed::FloatPairs, 300, {1}, 40},
+              {"float pairs of 7 samples", Feed::FloatPairs, 1'000, {7}, 1'000},
+              {"float pairs of 2 MiB", Feed::FloatPairs, 1'000'000, {mebi}, (1 << 20) + 24},
+              {"chunks of 1 MiB", Feed::Stream, 655'360, {mebi}, 4'100},
+              // at least 10^7 samples once, with markers
+              {"10^7 samples in chunks of 1 MiB", Feed::Stream, 10'000'000, {mebi}, (1 << 20) + 12}};
   for (const Row &row : rows) {
     SCOPED_TRACE(row.name);
     TempDir dir;
-    const auto [iq, markers] = exportInChunks(dir.path("w.wv"), row.feed, row.samples, row.chunks);
-    expectPackages(openWaveform(dir.path("w.wv")), row.feed == Feed::FloatPairs ? 4 : 2, iq, markers);
-    EXPECT_FALSE(fs::exists(dir.path("w.wv_mkr")));
+    const auto path = dir.path("w.wv");
+    const bool floating = row.feed == Feed::FloatPairs;
+    const Exported sent = exportInChunks(path, row.feed, row.samples, row.chunks);
+    if (row.samples <= 1'000'000) { // the largest file only reads back
+      expectPackages(openWaveform(path), floating ? 4 : 2, sent);
+    }
+    EXPECT_FALSE(fs::exists(path + "_mkr"));
+
+    streamingImporter2 importer;
+    ASSERT_TRUE(importer.Open(widePath(path).c_str()));
+    EXPECT_EQ(importer.GetIQDataLen(), row.samples);
+    EXPECT_EQ(importer.GetWavformFormatFlag(), floating ? 1 : 0);
+    Bytes head(200);
+    EXPECT_EQ(importer.GetHeader(head.data(), 200), 200);
+    EXPECT_EQ(head, sent.header);
+    Reader iq{[&](unsigned char *d, int n) { return importer.GetRawIQData(d, n); }, row.piece, sent.iq.size()};
+    Reader markers{[&](unsigned char *d, int n) { return importer.GetMarkers(d, n); }, row.piece / 3 + 16,
+                   sent.markers.size()};
+    while (iq.step() | markers.step()) {
+    }
+    EXPECT_TRUE(iq.got == sent.iq);
+    EXPECT_TRUE(markers.got == sent.markers);
   }
 }
 
 TEST(StreamingExporterTest, RunsOutOfOrderGiveTheirOwnResultsAndFiles) {
   TempDir dir;
-  Bytes h = noise(16, 1), iq = noise(64, 2), m = noise(16, 3);
+  Bytes h = patternBytes(16, 1), iq = patternBytes(64, 2), m = patternBytes(16, 3);
   const std::string target = dir.path("w.wv");
+  using Frames = std::vector<std::pair<std::uint32_t, std::uint32_t>>;
   auto packagesOf = [&] {
-    std::vector<std::pair<std::uint32_t, std::uint32_t>> tagsAndLengths;
+    Frames tagsAndLengths;
     for (const Package &p : openWaveform(target).packages) {
       tagsAndLengths.emplace_back(p.tag, p.length);
     }
     return tagsAndLengths;
   };
-  using Frames = std::vector<std::pair<std::uint32_t, std::uint32_t>>;
   {
     streamingExporter2 e(target, h.data(), 16);
     EXPECT_FALSE(e.stream(iq.data(), m.data(), 4, true)); // before start
@@ -125,6 +170,7 @@ TEST(StreamingExporterTest, RunsOutOfOrderGiveTheirOwnResultsAndFiles) {
     EXPECT_FALSE(e.streammarker(m.data(), -2));
     EXPECT_EQ(fs::file_size(target), 0u);
     EXPECT_TRUE(e.streamiq(iq.data(), 64)); // IQ alone: no marker package
+    EXPECT_TRUE(e.streamiq(nullptr, 0));    // an empty chunk needs no bytes
     e.stop();
     EXPECT_EQ(packagesOf(), (Frames{{1, 0}, {2, 64}}));
   }
@@ -139,6 +185,7 @@ TEST(StreamingExporterTest, RunsOutOfOrderGiveTheirOwnResultsAndFiles) {
     EXPECT_TRUE(e.start(4, true));
     EXPECT_TRUE(e.streamiq(iq.data(), 16));
     EXPECT_TRUE(e.streammarker(m.data(), 10));
+    EXPECT_TRUE(e.streammarker(nullptr, 0));
     e.stop();
     const WaveformFile file = openWaveform(target);
     ASSERT_GE(file.packages.size(), 3u);
@@ -148,9 +195,7 @@ TEST(StreamingExporterTest, RunsOutOfOrderGiveTheirOwnResultsAndFiles) {
   for (bool isFloat : {false, true}) { // an old marker file of an aborted run
     SCOPED_TRACE(isFloat ? "float" : "integer");
     std::ofstream(target + "_mkr", std::ios::binary) << std::string(16, 'x');
-    std::unique_ptr<Exporter2> e;
-    e = isFloat ? std::unique_ptr<Exporter2>(new streamingFloatExporter2(target, h.data(), 16))
-                : std::unique_ptr<Exporter2>(new streamingExporter2(target, h.data(), 16));
+    auto e = exporterFor(isFloat, target, h, 16);
     EXPECT_TRUE(e->start(4, true));
     EXPECT_TRUE(e->stream(iq.data(), m.data(), 4, true));
     EXPECT_EQ(fs::file_size(target), 32u + 16 + 32 + 16 + (isFloat ? 0 : 16));
@@ -161,6 +206,8 @@ TEST(StreamingExporterTest, RunsOutOfOrderGiveTheirOwnResultsAndFiles) {
     EXPECT_TRUE(e.start(true));
     EXPECT_FALSE(e.start(true));
     EXPECT_TRUE(e.stream(iq.data(), m.data(), 4, false));
+    EXPECT_TRUE(e.streammarker(m.data(), 16));
+    EXPECT_EQ(fs::file_size(target + "_tmp"), 1u + 16 + 4 + 16); // raw: count text, IQ, markers; more markers
     EXPECT_TRUE(e.stream(iq.data(), m.data(), 4, true));
     EXPECT_EQ(fs::file_size(target), 0u);
     EXPECT_FALSE(fs::exists(target + "_tmp"));
@@ -169,7 +216,7 @@ TEST(StreamingExporterTest, RunsOutOfOrderGiveTheirOwnResultsAndFiles) {
 
 TEST(StreamingExporterTest, UnwritableTargetLeavesNoFilesBehind) {
   TempDir dir;
-  Bytes h = noise(16, 1), iq = noise(64, 2), m = noise(16, 3);
+  Bytes h = patternBytes(16, 1), iq = patternBytes(64, 2), m = patternBytes(16, 3);
   {
     streamingExporter2 e(dir.path("missing/w.wv"), h.data(), 16);
     EXPECT_TRUE(e.start(8, true));
@@ -177,6 +224,16 @@ TEST(StreamingExporterTest, UnwritableTargetLeavesNoFilesBehind) {
     EXPECT_TRUE(e.stream(iq.data(), m.data(), 4, true));
     EXPECT_TRUE(e.failed());
     EXPECT_TRUE(fs::is_empty(dir.root()));
+  }
+  // A folder as the target: an unknown-length run writes no raw file beside it.
+  fs::create_directory(dir.path("folder"));
+  {
+    streamingExporter2 e(dir.path("folder"), h.data(), 16);
+    EXPECT_TRUE(e.start(true));
+    EXPECT_TRUE(e.streamiq(iq.data(), 64));
+    EXPECT_TRUE(e.streammarker(m.data(), 16));
+    EXPECT_TRUE(e.failed());
+    EXPECT_FALSE(fs::exists(dir.path("folder_tmp")));
   }
   // The target can be written but its marker file cannot: the target goes.
   fs::create_directory(dir.path("w.wv_mkr"));
@@ -189,7 +246,7 @@ TEST(StreamingExporterTest, UnwritableTargetLeavesNoFilesBehind) {
 
 TEST(StreamingExporterTest, OpenSslDecryptsTheFileToTheBodiesWritten) {
   TempDir dir;
-  const auto [iq, markers] = exportInChunks(dir.path("w.wv"), Feed::Stream, 300, {7});
+  const Exported sent = exportInChunks(dir.path("w.wv"), Feed::Stream, 300, {7});
   auto decrypt = [](const unsigned char *key, const Bytes &cipher) {
     Bytes plain(cipher.size());
     EVP_CIPHER_CTX *ctx = EVP_CIPHER_CTX_new();
@@ -210,5 +267,5 @@ TEST(StreamingExporterTest, OpenSslDecryptsTheFileToTheBodiesWritten) {
   // The head key, spelled out here so that the check does not borrow it.
   const unsigned char headKey[16] = {0x54, 0x0a, 0x1e, 0x71, 0x2a, 0xba, 0x28, 0x70,
                                      0xe9, 0x7b, 0x16, 0x19, 0x97, 0xe2, 0x99, 0xe0};
-  expectPackages(openWaveform(dir.path("w.wv"), decrypt, dataKey, headKey), 2, iq, markers);
+  expectPackages(openWaveform(dir.path("w.wv"), decrypt, dataKey, headKey), 2, sent);
 }

@@ -1,4 +1,3 @@
-#include "wavemill/waveform/StreamingExporter2.h"
 #include "wavemill/waveform/StreamingImporter2.h"
 
 #include "support/TempDir.h"
@@ -8,8 +7,6 @@
 
 #include <algorithm>
 #include <cstring>
-#include <functional>
-#include <memory>
 #include <string>
 
 using namespace Corvane::Wavemill;
@@ -23,30 +20,6 @@ struct Importer : streamingImporter2 {
     unsigned char key[16];
     std::memcpy(key, fixedFileKey, 16); // no GetKey yet: the mask is 0
     return Open(widePath(path).c_str(), key);
-  }
-};
-
-// Reads one channel of a file, `piece` bytes at a time, up to `total`.
-struct Reader {
-  std::function<int(unsigned char *, int)> read;
-  int piece;
-  std::size_t total;
-  Bytes got{};
-  // False when the channel is done. A read that the kept surplus serves
-  // alone answers 0 but has delivered its bytes, as a caller counting the
-  // samples knows.
-  bool step() {
-    const auto want = static_cast<int>(std::min<std::size_t>(static_cast<std::size_t>(piece), total - got.size()));
-    if (want == 0) {
-      return false;
-    }
-    Bytes buffer(static_cast<std::size_t>(want));
-    const int n = read(buffer.data(), want);
-    if (n == 0 && want >= 16) {
-      return false;
-    }
-    got.insert(got.end(), buffer.begin(), buffer.begin() + (n > 0 ? n : want));
-    return true;
   }
 };
 
@@ -161,66 +134,4 @@ TEST(StreamingImporterTest, AFileEndingInsideTheIqThrowsMinusOneAndMissingMarker
   ASSERT_TRUE(importer.openWithFileKey(dir.path("i.wv")));
   Bytes iq(4000);
   EXPECT_THROW(importer.GetRawIQData(iq.data(), 4000), int);
-}
-
-TEST(StreamingImporterTest, BothStreamingExportersInChunksOfAnySizeReadBackByteForByte) {
-  TempDir dir;
-  constexpr int mebiSamples = (1 << 20) / 4;
-  struct Row {
-    bool floating; // tag 4 through streamiq and streammarker, 8 bytes a sample
-    int chunk;     // samples
-    int samples;
-    int piece; // bytes per read
-  } rows[] = {
-      {false, 1, 300, 28},
-      {false, 7, 1'000, 60},
-      {true, 1, 300, 40},
-      {true, 7, 1'000, 1'000},
-      {true, mebiSamples, 1'000'000, (1 << 20) + 24},
-      {false, mebiSamples, 10'000'000, (1 << 20) + 12}, // at least 10^7 samples once, with markers
-  };
-  for (const auto &row : rows) {
-    SCOPED_TRACE(std::to_string(row.chunk) + (row.floating ? " floating" : " integer"));
-    const int width = row.floating ? 8 : 4;
-    auto header = patternBytes(200, 51);
-    const auto iq = patternBytes(static_cast<std::size_t>(width) * row.samples, 52);
-    const auto markers = patternBytes(static_cast<std::size_t>(row.samples), 53);
-    const auto path = dir.path(std::to_string(row.chunk) + (row.floating ? "f.wv" : "i.wv"));
-    {
-      std::unique_ptr<Exporter2> exporter;
-      if (row.floating) {
-        exporter = std::make_unique<streamingFloatExporter2>(path, header.data(), 200);
-      } else {
-        exporter = std::make_unique<streamingExporter2>(path, header.data(), 200);
-      }
-      ASSERT_TRUE(exporter->start(row.samples, true));
-      auto *bytes = const_cast<unsigned char *>(iq.data());
-      auto *packed = const_cast<unsigned char *>(markers.data());
-      for (int at = 0; at < row.samples; at += row.chunk) {
-        const int n = std::min(row.chunk, row.samples - at);
-        if (row.floating) {
-          ASSERT_TRUE(exporter->streamiq(bytes + static_cast<std::size_t>(width) * at, width * n));
-          ASSERT_TRUE(exporter->streammarker(packed + at, n));
-        } else {
-          ASSERT_TRUE(
-              exporter->stream(bytes + 4 * static_cast<std::size_t>(at), packed + at, n, at + n == row.samples));
-        }
-      }
-      exporter->stop();
-    }
-    Importer importer;
-    ASSERT_TRUE(importer.Open(widePath(path).c_str()));
-    EXPECT_EQ(importer.GetIQDataLen(), row.samples);
-    EXPECT_EQ(importer.GetWavformFormatFlag(), row.floating ? 1 : 0);
-    Bytes head(200);
-    EXPECT_EQ(importer.GetHeader(head.data(), 200), 200);
-    EXPECT_EQ(head, header);
-    Reader iqReader{[&](unsigned char *d, int n) { return importer.GetRawIQData(d, n); }, row.piece, iq.size()};
-    Reader markerReader{[&](unsigned char *d, int n) { return importer.GetMarkers(d, n); }, row.piece / 3 + 16,
-                        markers.size()};
-    while (iqReader.step() | markerReader.step()) {
-    }
-    EXPECT_TRUE(iqReader.got == iq);
-    EXPECT_TRUE(markerReader.got == markers);
-  }
 }
