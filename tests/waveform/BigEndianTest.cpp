@@ -14,21 +14,6 @@ using Bytes = std::vector<unsigned char>;
 
 namespace {
 
-// One row: `value` encodes to exactly `expected`, and decoding `expected`
-// gives the value back and moves the position past it.
-template <typename T> void expectRoundTrip(const char *row, T value, const Bytes &expected) {
-  SCOPED_TRACE(row);
-  auto bytes = std::make_shared<Bytes>();
-  BigEndian::append(bytes, value);
-  EXPECT_EQ(*bytes, expected);
-  Bytes input = expected;
-  T back{};
-  int pos = 0;
-  BigEndian::parse(gsl::make_span(input), &pos, &back);
-  EXPECT_EQ(back, value);
-  EXPECT_EQ(pos, static_cast<int>(expected.size()));
-}
-
 // swapBytes gives the value with its bytes in reverse order.
 template <typename T> void expectSwapped(T value) {
   const T swapped = swapBytes::doit(value);
@@ -41,20 +26,12 @@ template <typename T> void expectSwapped(T value) {
 
 } // namespace
 
-TEST(BigEndianTest, EveryWidthRoundTripsMostSignificantByteFirst) {
-  expectRoundTrip<unsigned char>("unsigned char", 0xA5, {0xA5});
-  expectRoundTrip<char>("char", static_cast<char>(-2), {0xFE});
-  expectRoundTrip<unsigned short>("unsigned short", 0x1234, {0x12, 0x34});
-  expectRoundTrip<unsigned int>("unsigned int", 0x89ABCDEFu, {0x89, 0xAB, 0xCD, 0xEF});
-  expectRoundTrip<float>("float", -1.0f, {0xBF, 0x80, 0x00, 0x00});
-  expectRoundTrip<double>("double", -2.5, {0xC0, 0x04, 0, 0, 0, 0, 0, 0});
-
-  auto bytes = std::make_shared<Bytes>();
-  BigEndian::append(bytes, static_cast<unsigned char>(1), static_cast<unsigned short>(0x0203), std::string("x\0y", 3));
-  EXPECT_EQ(*bytes, (Bytes{0x01, 0x02, 0x03, 'x', 0x00, 'y'})); // a string has no length and no terminator
-}
-
+// The widths and their byte order: the waveform header tests hold every
+// type against tabled bytes and read each back.
 TEST(BigEndianTest, MakeBlockStoresTheContentLengthInEightBits) {
+  const auto mixed = BigEndian::makeBlock(7, static_cast<unsigned char>(1), static_cast<unsigned short>(0x0203),
+                                          std::string("x\0y", 3));
+  EXPECT_EQ(*mixed, (Bytes{7, 6, 0x01, 0x02, 0x03, 'x', 0x00, 'y'})); // a string has no length and no terminator
   const struct {
     std::size_t content;
     unsigned char sizeByte;
@@ -63,7 +40,6 @@ TEST(BigEndianTest, MakeBlockStoresTheContentLengthInEightBits) {
     SCOPED_TRACE(row.content);
     const auto block = BigEndian::makeBlock(7, std::string(row.content, 'a'));
     ASSERT_EQ(block->size(), row.content + 2);
-    EXPECT_EQ((*block)[0], 7);
     EXPECT_EQ((*block)[1], row.sizeByte);
   }
 }
