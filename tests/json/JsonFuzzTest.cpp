@@ -3,9 +3,6 @@
 
 #include "JsonTestModels.h"
 
-#include "wavemill/models/Couplings.h"
-#include "wavemill/models/Interceptor.h"
-
 #include <gtest/gtest.h>
 
 #include <atomic>
@@ -73,13 +70,13 @@ TEST(JsonFuzzTest, DamagedDocumentsNeverBreakTheReader) {
   JsonSerializer serializer;
   serializer.getActivator()->updateFullTypeNames("Lab", "Corvane.Lab");
   DisplayDataSerializer display;
-  const std::vector<std::string> seeds = {serializer.serialize(JsonTests::makeBench()),
+  const std::vector<std::string> seeds = {serializer.serialize(JsonTests::makeRack()),
                                           serializer.serialize(JsonTests::makeFilter()),
-                                          display.serialize(JsonTests::makeBench()->filter->getValue())};
+                                          display.serialize(JsonTests::makeRack()->source->getValue())};
 
   std::mt19937 random(20261122);
   int trees = 0;
-  auto existing = JsonTests::makeBench();
+  auto existing = JsonTests::makeRack();
   for (int round = 0; round < 30000; ++round) {
     const std::string &seed = seeds[round % seeds.size()];
     std::string text;
@@ -109,10 +106,10 @@ TEST(JsonFuzzTest, DamagedDocumentsNeverBreakTheReader) {
       ASSERT_TRUE(again->hasItem("$type")) << text;
     }
     if (round % 100 == 0)
-      existing = JsonTests::makeBench();
+      existing = JsonTests::makeRack();
     serializer.deserializeToExistObject(object, existing);
     try {
-      display.deserializeToExistObject(object, existing->filter->getValue());
+      display.deserializeToExistObject(object, existing->source->getValue());
     } catch (const std::invalid_argument &) {
       // Limits that are no numbers: the display form lets these through.
     } catch (const std::out_of_range &) {
@@ -127,10 +124,10 @@ TEST(JsonFuzzTest, DamagedDocumentsNeverBreakTheReader) {
 TEST(JsonFuzzTest, DamagedRecallIntoALiveTreeLeavesItUsable) {
   JsonSerializer serializer;
   serializer.getActivator()->updateFullTypeNames("Lab", "Corvane.Lab");
-  const std::string seed = serializer.serialize(JsonTests::makeBench());
-  auto live = JsonTests::makeBench();
-  Interceptor interceptor(live);
-  live->activateSettings(&interceptor, nullptr);
+  const std::string seed = serializer.serialize(JsonTests::makeRack());
+  Testing::LiveTree<Testing::Rack> tree(JsonTests::makeRack());
+  const auto &live = tree.root;
+  Interceptor &interceptor = tree.interceptor;
   std::atomic<int> couplings{0};
   live->setCouplings(std::make_shared<Couplings>([&](ModelBase *, Transaction *) { ++couplings; }));
 
@@ -151,7 +148,7 @@ TEST(JsonFuzzTest, DamagedRecallIntoALiveTreeLeavesItUsable) {
     SCOPED_TRACE(text);
     ASSERT_EQ(faultsIn(live, nullptr, &interceptor), 0);
     const int before = couplings.load();
-    auto write = std::async(std::launch::async, [&] { live->level->setValue(round % 7); });
+    auto write = std::async(std::launch::async, [&] { live->name->setValue(std::to_string(round % 7)); });
     ASSERT_EQ(write.wait_for(std::chrono::seconds(5)), std::future_status::ready) << "the tree stayed locked";
     EXPECT_GT(couplings.load(), before);
   }

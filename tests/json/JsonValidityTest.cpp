@@ -18,38 +18,33 @@ TEST(JsonValidityTest, StandardParserReadsOurDocuments) {
   Testing::TempDir folder;
   JsonSerializer serializer;
   serializer.getActivator()->updateFullTypeNames("Lab", "Corvane.Lab");
-  DisplayDataSerializer display;
   auto manager = std::make_shared<ApplicationManager>();
   manager->getApplications()->add(std::make_shared<ApplicationBase>());
-
+  auto rack = JsonTests::makeRack();
+  rack->name->setValue("Band \"pass\"\twith\nlines \\ and 'marks'");
   Tools::writeText(folder.path("filter.json"), serializer.serialize(JsonTests::makeFilter()));
-  auto bench = JsonTests::makeBench();
-  bench->filter->getValue()->title->setValue("Band \"pass\"\twith\nlines \\ and 'marks'");
-  Tools::writeText(folder.path("bench.json"), serializer.serialize(bench));
-  Tools::writeText(folder.path("display.json"), display.serialize(JsonTests::makeBench()->filter->getValue()));
+  Tools::writeText(folder.path("rack.json"), serializer.serialize(rack));
+  Tools::writeText(folder.path("display.json"), DisplayDataSerializer().serialize(rack->source->getValue()));
   Tools::writeText(folder.path("manager.json"), serializer.serialize(manager));
 
-  const std::string script = R"(
+  Tools::writeText(folder.path("check.py"), R"(
 import json, sys
-folder = sys.argv[1]
 def load(name):
-    with open(folder + "/" + name, encoding="utf-8") as f:
+    with open(sys.argv[1] + "/" + name, encoding="utf-8") as f:
         return json.load(f)
 filter = load("filter.json")
 assert filter["$type"] == "Corvane.Lab.Filter, Lab", filter["$type"]
 assert filter["Cutoff"] == 1000 and filter["Title"] == "Low pass"
 assert [t["Text"] for t in filter["Texts"]["$values"]] == ["One", "Two"]
-bench = load("bench.json")
-assert bench["Filter"]["Title"] == "Band \"pass\"\twith\nlines \\ and 'marks'", bench["Filter"]["Title"]
-tracks = bench["Tracks"]["$values"]
-assert [len(t["Segments"]["$values"]) for t in tracks] == [1, 2, 3]
-assert tracks[2]["Segments"]["$values"][1]["Offset"] == -(1 << 40) + 1
+rack = load("rack.json")
+assert rack["Name"] == "Band \"pass\"\twith\nlines \\ and 'marks'", rack["Name"]
+sources = rack["Sources"]["$values"]
+assert [s["Count"] for s in sources] == [1, 11, 21] and sources[2]["Offset"] == -(1 << 40) + 2
+assert rack["Source"]["Level"] == -42.5 and sources[0]["On"] is True and sources[1]["Label"] == "S1"
 display = load("display.json")
-assert display["Cutoff"]["$type"] == "DoubleSetting" and display["Cutoff"]["Max"] == 1e9
-manager = load("manager.json")
-assert manager["Applications"]["$values"] == [{"$type": "Corvane.Wavemill.ApplicationBase"}]
-)";
-  Tools::writeText(folder.path("check.py"), script);
+assert display["Frequency"]["$type"] == "DoubleSetting" and display["Frequency"]["Max"] == 40e9
+assert load("manager.json")["Applications"]["$values"] == [{"$type": "Corvane.Wavemill.ApplicationBase"}]
+)");
   const std::string command = "python3 " + folder.path("check.py") + " " + folder.root();
   EXPECT_EQ(std::system(command.c_str()), 0) << "python3 refused a document in " << folder.root();
 }

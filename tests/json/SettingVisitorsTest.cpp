@@ -5,7 +5,7 @@
 #include "wavemill/models/ContextSetting.h"
 #include "wavemill/models/Prototype.h"
 
-#include "JsonTestModels.h"
+#include "support/TestModels.h"
 
 #include <gtest/gtest.h>
 
@@ -13,6 +13,8 @@
 #include <vector>
 
 using namespace Corvane::Wavemill;
+
+constexpr auto npos = std::string::npos;
 
 namespace {
 
@@ -35,14 +37,6 @@ public:
   const char *names[3] = {"CW", "AM", "FM"};
 };
 
-// A model of sub-models only.
-struct Holder : ModelBase {
-  WAVEMILL_MODEL(Holder)
-  Holder() : ModelBase("Holder") {}
-  std::shared_ptr<SubSetting<JsonTests::Filter>> filter =
-      init(std::make_shared<SubSetting<JsonTests::Filter>>("Filter"));
-};
-
 std::string written(Setting &setting) {
   SettingToJsonVisitor visitor;
   setting.visit(&visitor);
@@ -62,24 +56,29 @@ TEST(SettingVisitorsTest, WritesKindsLimitsAndFlags) {
                             "\"Level\",\n  \"NepStep\": 1,\n  \"ReadOnly\": false,\n  \"Value\": 1.5,\n  \"Visible\": "
                             "true\n}\n");
   DoubleSetting open("Open"); // no limits and no step
-  EXPECT_EQ(written(open).find("Min"), std::string::npos);
-  EXPECT_EQ(written(open).find("\"Step\""), std::string::npos);
   Int32Setting count("Count", 3, 0, 2147483647, 1);
-  EXPECT_NE(written(count).find("\"Min\": 0,"), std::string::npos);
-  EXPECT_EQ(written(count).find("Max"), std::string::npos);
   StringSetting title("Title");
   title.setReadOnly(true);
-  EXPECT_NE(written(title).find("\"$type\": \"StringSetting\",\n  \"MaxLength\": 65536,"), std::string::npos);
-  EXPECT_NE(written(title).find("\"ReadOnly\": true"), std::string::npos);
   BoolSetting output("Output");
-  EXPECT_NE(written(output).find("\"Value\": false"), std::string::npos);
-
-  ModeSetting mode;
-  EXPECT_EQ(written(mode).find("ValidValues"), std::string::npos);
-  mode.valid = {0, 2};
-  EXPECT_NE(written(mode).find("\"$type\": \"EnumSetting\""), std::string::npos);
-  EXPECT_NE(written(mode).find("\"ValidValues\": [\n    0,\n    2\n  ]"), std::string::npos);
-  EXPECT_NE(written(mode).find("\"Value\": \"0\""), std::string::npos);
+  ModeSetting mode, listed;
+  listed.valid = {0, 2};
+  const struct {
+    Setting &setting;
+    const char *part;
+    bool present;
+  } cases[] = {{open, "Min", false},
+               {open, "\"Step\"", false},
+               {count, "\"Min\": 0,", true},
+               {count, "Max", false},
+               {title, "\"$type\": \"StringSetting\",\n  \"MaxLength\": 65536,", true},
+               {title, "\"ReadOnly\": true", true},
+               {output, "\"Value\": false", true},
+               {mode, "ValidValues", false},
+               {listed, "\"$type\": \"EnumSetting\"", true},
+               {listed, "\"ValidValues\": [\n    0,\n    2\n  ]", true},
+               {listed, "\"Value\": \"0\"", true}};
+  for (const auto &c : cases)
+    EXPECT_EQ(written(c.setting).find(c.part) != npos, c.present) << c.setting.getName() << " " << c.part;
 
   // A setting that is not an enum leaves the previous object in place.
   SettingToJsonVisitor visitor;
@@ -119,82 +118,78 @@ TEST(SettingVisitorsTest, ReadsValuesLimitsAndFlags) {
   // Numbers that cannot be read reach the caller as standard exceptions.
   Int32Setting count("Count");
   Int64Setting offset("Offset");
-  auto message = [](auto &&action) {
+  const struct {
+    Setting &setting;
+    const char *text, *message;
+  } failures[] = {{count, "{\"Value\": 1,\n\"Min\": \"x\"\n}", "invalid stoi argument"},
+                  {count, "{\"Value\": 1,\n\"Max\": 99999999999\n}", "stoi argument out of range"},
+                  {offset, "{\"Value\": 1,\n\"Step\": -\n}", "invalid stoll argument"},
+                  {level, "{\"Value\": 1,\n\"NepStep\": 1e999\n}", "stod argument out of range"}};
+  for (const auto &f : failures) {
+    std::string message = "none";
     try {
-      action();
+      read(f.setting, f.text);
     } catch (const std::exception &e) {
-      return std::string(e.what());
+      message = e.what();
     }
-    return std::string("none");
-  };
-  EXPECT_EQ(message([&] { read(count, "{\"Value\": 1,\n\"Min\": \"x\"\n}"); }), "invalid stoi argument");
-  EXPECT_EQ(message([&] { read(count, "{\"Value\": 1,\n\"Max\": 99999999999\n}"); }), "stoi argument out of range");
-  EXPECT_EQ(message([&] { read(offset, "{\"Value\": 1,\n\"Step\": -\n}"); }), "invalid stoll argument");
-  EXPECT_EQ(message([&] { read(level, "{\"Value\": 1,\n\"NepStep\": 1e999\n}"); }), "stod argument out of range");
+    EXPECT_EQ(message, f.message) << f.text;
+  }
 }
 
 TEST(SettingVisitorsTest, ConvertersByDefaultAndTheirReadings) {
-  BoolSetting output("Output");
-  EXPECT_EQ(output.getConverter(), Prototype::getInstance<OnOffConverter>());
-  EXPECT_EQ(output.convertTo(), "Off");
-  output.convertBack("ON");
-  EXPECT_TRUE(output.getValue());
-  output.convertBack("1");
-  EXPECT_FALSE(output.getValue());
-  output.setConverter(std::make_shared<BoolConverter>());
-  output.convertBack("On");
-  EXPECT_FALSE(output.getValue());
-  output.convertBack("TRUE");
-  EXPECT_TRUE(output.getValue());
-  EXPECT_EQ(output.convertTo(), "true");
-  EXPECT_EQ(output.getConverter()->toString(), "ConverterBase");
-
+  BoolSetting onOff("OnOff"), plain("Plain");
   Int32Setting count("Count");
-  EXPECT_EQ(count.getConverter(), Prototype::getInstance<Int32Converter>());
-  count.convertBack("12abc");
-  EXPECT_EQ(count.getValue(), 12);
-  EXPECT_THROW(count.convertBack("abc"), std::invalid_argument);
   Int64Setting offset("Offset");
-  offset.convertBack("-9000000000");
-  EXPECT_EQ(offset.getValue(), -9000000000LL);
-  EXPECT_THROW(offset.convertBack("99999999999999999999"), std::out_of_range);
   DoubleSetting level("Level");
-  level.convertBack(" 2.5e3V");
-  EXPECT_EQ(level.getValue(), 2500.0);
   StringSetting title("Title");
-  title.convertBack("Low pass");
-  EXPECT_EQ(title.convertTo(), "Low pass");
-  EXPECT_EQ(ContextSetting("Context").getConverter(), Prototype::getInstance<StringConverter>());
-
   ModeSetting mode;
+  EXPECT_EQ(onOff.getConverter(), Prototype::getInstance<OnOffConverter>());
+  EXPECT_EQ(count.getConverter(), Prototype::getInstance<Int32Converter>());
   EXPECT_EQ(mode.getConverter(), Prototype::getInstance<EnumConverterBase>());
-  mode.convertBack("FM");
-  EXPECT_EQ(mode.getValue(), 2);
-  mode.convertBack("PM");
-  EXPECT_EQ(mode.getValue(), 2);
+  EXPECT_EQ(ContextSetting("Context").getConverter(), Prototype::getInstance<StringConverter>());
+  EXPECT_EQ(onOff.convertTo(), "Off");
+  plain.setConverter(std::make_shared<BoolConverter>());
+  EXPECT_EQ(plain.getConverter()->toString(), "ConverterBase");
+
+  // Each row reads a text into the setting and shows what it holds then.
+  const struct {
+    Setting &setting;
+    const char *text, *shown;
+  } readings[] = {{onOff, "ON", "On"},        {onOff, "1", "Off"},
+                  {plain, "TRUE", "true"},    {plain, "On", "false"},
+                  {count, "12abc", "12"},     {offset, "-9000000000", "-9000000000"},
+                  {level, " 2.5e3V", "2500"}, {title, "Low pass", "Low pass"},
+                  {mode, "FM", "2"},          {mode, "PM", "2"}}; // an unknown name keeps the value
+  for (const auto &r : readings) {
+    r.setting.convertBack(r.text);
+    EXPECT_EQ(r.setting.convertTo(), r.shown) << r.setting.getName() << " " << r.text;
+  }
+  EXPECT_THROW(count.convertBack("abc"), std::invalid_argument);
+  EXPECT_THROW(offset.convertBack("99999999999999999999"), std::out_of_range);
 }
 
 TEST(SettingVisitorsTest, DisplayDataDescribesEachStoredPlainSetting) {
   DisplayDataSerializer display;
-  display.getActivator()->registerType<JsonTests::Segment>("");
-  auto segment = std::make_shared<JsonTests::Segment>();
-  segment->samples->setValue(64);
-  segment->label->setValue("first\nsecond");
-  const std::string text = display.serialize(segment);
-  EXPECT_NE(text.find("\"Samples\": {\n    \"$type\": \"Int32Setting\""), std::string::npos);
-  EXPECT_NE(text.find("\"Value\": \"first\\nsecond\""), std::string::npos);
+  display.getActivator()->registerType<Testing::Source>("");
+  auto source = std::make_shared<Testing::Source>();
+  source->count->setValue(64);
+  source->label->setValue("first\nsecond");
+  const std::string text = display.serialize(source);
+  EXPECT_NE(text.find("\"Count\": {\n    \"$type\": \"Int32Setting\""), npos);
+  EXPECT_NE(text.find("\"Value\": \"first\\nsecond\""), npos);
 
-  auto other = std::make_shared<JsonTests::Segment>();
+  auto other = std::make_shared<Testing::Source>();
   other->offset->setMaximum(5);
   std::string partial = text;
-  partial.erase(partial.find("  \"Offset\""), partial.find("  \"Samples\"") - partial.find("  \"Offset\""));
+  partial.erase(partial.find("  \"Offset\""), partial.find("  \"On\"") - partial.find("  \"Offset\""));
   EXPECT_TRUE(display.deserializeToExistObject(JsonSerializer::parse(partial), other));
-  EXPECT_EQ(other->samples->getValue(), 64);
+  EXPECT_EQ(other->count->getValue(), 64);
   EXPECT_EQ(other->label->getValue(), "first\nsecond");
   EXPECT_EQ(other->offset->getMaximum(), 5); // no member: kept as it was
 
-  // Sub-models are not part of the display form.
-  EXPECT_EQ(display.serialize(std::make_shared<JsonTests::Filter>()).find("Texts"), std::string::npos);
-  auto holder = std::make_shared<Holder>();
-  EXPECT_EQ(display.serialize(holder), "{\n  \"$type\": \"" + display.getActivator()->toName(holder) + "\"\n}\n");
+  // Sub-models are not part of the display form: a rack without its name
+  // shows only its class.
+  auto rack = std::make_shared<Testing::Rack>();
+  rack->name->setPersisted(false);
+  EXPECT_EQ(display.serialize(rack), "{\n  \"$type\": \"" + display.getActivator()->toName(rack) + "\"\n}\n");
 }
