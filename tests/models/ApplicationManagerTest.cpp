@@ -1,5 +1,5 @@
 #include "wavemill/models/ApplicationManager.h"
-#include "wavemill/models/DoubleSetting.h"
+#include "support/TestModels.h"
 
 #include <gtest/gtest.h>
 
@@ -14,10 +14,9 @@ struct Scope : ApplicationBase {
 };
 
 // A manager root with a recorder on `transactions`.
-class ApplicationManagerTest : public testing::Test {
+class ApplicationManagerTest : public testing::Test, public Testing::LiveTree<ApplicationManager> {
 protected:
   ApplicationManagerTest() {
-    manager->activateSettings(&interceptor, nullptr);
     manager->transactions.get_observable().subscribe(
         [this](Transaction *t) { seen.push_back(t->getSetting()->getName() + ":" + t->getMethodName()); });
   }
@@ -26,8 +25,7 @@ protected:
     manager->getApplications()->add(scope);
     return scope;
   }
-  std::shared_ptr<ApplicationManager> manager = std::make_shared<ApplicationManager>();
-  Interceptor interceptor{manager};
+  std::shared_ptr<ApplicationManager> &manager = root;
   std::vector<std::string> seen;
 };
 

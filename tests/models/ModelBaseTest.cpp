@@ -159,8 +159,6 @@ TEST_F(ModelBaseTest, ResetRestoresResettableSettingsUnderOneCoupling) {
   inactive.reset();
   EXPECT_EQ(inactive.level->getValue(), -10.0);
   EXPECT_EQ(inactive.label->getValue(), "idle");
-  // The shared empty transaction of an inactive reset keeps its option.
-  EXPECT_EQ(Transaction::empty()->getOption(), TransactionOption::NoCouple);
 
   model->change();
   couples = 0;

@@ -1,5 +1,4 @@
-#include "wavemill/models/Couplings.h"
-#include "wavemill/models/ModelCollection.h"
+#include "support/TestModels.h"
 
 #include <gtest/gtest.h>
 
@@ -28,9 +27,8 @@ using namespace CollectionConcurrencyTests;
 // to indices, and the last one sees every item (each holds 1).
 TEST(ModelCollectionConcurrencyTest, AddRemoveAndWritesFromSeveralThreadsStaySerial) {
   constexpr int threads = 4, rounds = 200;
-  auto board = std::make_shared<Board>();
-  Interceptor tree(board);
-  board->activateSettings(&tree, nullptr);
+  Testing::LiveTree<Board> tree;
+  auto &board = tree.root;
   auto slots = board->slots->getValue();
   int badKeys = 0;
   board->setCouplings(std::make_shared<Couplings>([&](ModelBase *, Transaction *) {

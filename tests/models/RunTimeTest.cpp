@@ -64,42 +64,42 @@ TEST(RunTimeTest, MicrosoftSignaturesGiveFullAndShortNames) {
 }
 
 TEST(RunTimeTest, TextWithoutClassGivesEmptyNames) {
-  EXPECT_EQ(RunTime::doGetFullTypeName("", 1), "");
-  EXPECT_EQ(RunTime::doGetTypeName("", 1), "");
-  EXPECT_EQ(RunTime::doGetFullTypeName(nullptr, 0), "");
-  EXPECT_EQ(RunTime::doGetTypeName(nullptr, 0), "");
+  // A size that ends the text before its last "::" hides the class.
+  for (auto [text, size] : {std::pair<const char *, int>{"", 1}, {nullptr, 0}, {"void A::f(void)", 3}}) {
+    SCOPED_TRACE(text ? text : "null");
+    EXPECT_EQ(RunTime::doGetFullTypeName(text, size), "");
+    EXPECT_EQ(RunTime::doGetTypeName(text, size), "");
+  }
   EXPECT_EQ(RunTime::fullTypeNameOf(""), "");
   EXPECT_EQ(RunTime::typeNameOf(nullptr), "");
-  // A size that ends the text before its last "::" hides the class.
-  EXPECT_EQ(RunTime::doGetFullTypeName("void A::f(void)", 3), "");
-  EXPECT_EQ(RunTime::doGetTypeName("void A::f(void)", 3), "");
 }
 
 TEST(RunTimeTest, LastIndexOfSearchesDownFromStartAndStaysInsideText) {
-  const char *text = "a:b:c";
-  EXPECT_EQ(RunTime::lastIndexOf(text, ':', 5), 3); // 5 is the terminator's index
-  EXPECT_EQ(RunTime::lastIndexOf(text, ':', 3), 3);
-  EXPECT_EQ(RunTime::lastIndexOf(text, ':', 2), 1);
-  EXPECT_EQ(RunTime::lastIndexOf(text, 'a', 4), 0);
-  EXPECT_EQ(RunTime::lastIndexOf(text, ':', 0), -1);
-  EXPECT_EQ(RunTime::lastIndexOf(text, 'x', 5), -1);
-  EXPECT_EQ(RunTime::lastIndexOf(text, ':', -1), -1);
+  // Searching "a:b:c" from a start index (5 is the terminator's); a start
+  // past the end is read as the end, not as memory behind the text.
+  const struct {
+    char wanted;
+    int start, found;
+  } rows[] = {{':', 5, 3},  {':', 3, 3},  {':', 2, 1},   {'a', 4, 0},
+              {':', 0, -1}, {'x', 5, -1}, {':', -1, -1}, {':', 1000, 3}};
+  for (const auto &row : rows)
+    EXPECT_EQ(RunTime::lastIndexOf("a:b:c", row.wanted, row.start), row.found) << row.wanted << " from " << row.start;
   EXPECT_EQ(RunTime::lastIndexOf("", '\0', 0), -1);
   EXPECT_EQ(RunTime::lastIndexOf(nullptr, ':', 0), -1);
-  // A start past the end is read as the end, not as memory behind the text.
-  EXPECT_EQ(RunTime::lastIndexOf(text, ':', 1000), 3);
 }
 
 TEST(RunTimeTest, ShortClassNameTakesTextBehindLastColonElseLastInnerBlank) {
-  EXPECT_EQ(RunTime::getShortClassName("class Corvane::Wavemill::TextPair"), "TextPair");
-  EXPECT_EQ(RunTime::getShortClassName("class TextPair"), "TextPair");
-  EXPECT_EQ(RunTime::getShortClassName("int"), "int");
-  EXPECT_EQ(RunTime::getShortClassName(""), "");
-  // A blank that ends the name is not the one in front of the class.
-  EXPECT_EQ(RunTime::getShortClassName("class Foo> "), "Foo> ");
-  // Neither a colon nor a blank at the very start separates anything.
-  EXPECT_EQ(RunTime::getShortClassName(":Foo"), ":Foo");
-  EXPECT_EQ(RunTime::getShortClassName(" Foo"), " Foo");
+  // A blank that ends the name is not the one in front of the class, and
+  // neither a colon nor a blank at the very start separates anything.
+  const std::pair<const char *, const char *> rows[] = {{"class Corvane::Wavemill::TextPair", "TextPair"},
+                                                        {"class TextPair", "TextPair"},
+                                                        {"int", "int"},
+                                                        {"", ""},
+                                                        {"class Foo> ", "Foo> "},
+                                                        {":Foo", ":Foo"},
+                                                        {" Foo", " Foo"}};
+  for (const auto &[text, brief] : rows)
+    EXPECT_EQ(RunTime::getShortClassName(text), brief) << text;
 }
 
 TEST(RunTimeTest, AdaptSignatureRewritesGccMemberText) {
@@ -134,19 +134,21 @@ TEST(RunTimeTest, MacrosNameTheClassOfTheEnclosingMember) {
   using namespace Corvane::Wavemill;
   const RunTimeProbeModel model;
   const RunTimeProbeBase &asBase = model;
-  EXPECT_EQ(asBase.getTypeName(), "RunTimeProbeModel");
-  EXPECT_EQ(asBase.getFullTypeName(), "Corvane.Wavemill.RunTimeProbeModel");
   const RunTimeProbeCollection<RunTimeProbePair> pairs;
-  EXPECT_EQ(pairs.getTypeName(), "RunTimeProbeCollection`1[[RunTimeProbePair]]");
-  EXPECT_EQ(pairs.getFullTypeName(),
-            "Corvane::Wavemill::RunTimeProbeCollection`1[[Corvane::Wavemill::RunTimeProbePair]]");
   const RunTimeProbeCollection<int> numbers;
-  EXPECT_EQ(numbers.getTypeName(), "RunTimeProbeCollection`1[[int]]");
-  EXPECT_EQ(numbers.getFullTypeName(), "Corvane::Wavemill::RunTimeProbeCollection`1[[int]]");
   const RunTimeProbePlain plain;
-  EXPECT_EQ(plain.getTypeName(), "RunTimeProbePlain");
-  EXPECT_EQ(plain.getFullTypeName(), "RunTimeProbePlain");
-  EXPECT_EQ(Deep::Deeper::RunTimeProbeInner::getFullTypeName(), "Corvane.Wavemill.Deep.Deeper.RunTimeProbeInner");
+  const std::pair<std::string, std::string> rows[] = {
+      {asBase.getTypeName(), "RunTimeProbeModel"},
+      {asBase.getFullTypeName(), "Corvane.Wavemill.RunTimeProbeModel"},
+      {pairs.getTypeName(), "RunTimeProbeCollection`1[[RunTimeProbePair]]"},
+      {pairs.getFullTypeName(), "Corvane::Wavemill::RunTimeProbeCollection`1[[Corvane::Wavemill::RunTimeProbePair]]"},
+      {numbers.getTypeName(), "RunTimeProbeCollection`1[[int]]"},
+      {numbers.getFullTypeName(), "Corvane::Wavemill::RunTimeProbeCollection`1[[int]]"},
+      {plain.getTypeName(), "RunTimeProbePlain"},
+      {plain.getFullTypeName(), "RunTimeProbePlain"},
+      {Deep::Deeper::RunTimeProbeInner::getFullTypeName(), "Corvane.Wavemill.Deep.Deeper.RunTimeProbeInner"}};
+  for (const auto &[actual, expected] : rows)
+    EXPECT_EQ(actual, expected);
 
   // The compiler's own text of a nested collection ends in the same odd
   // names as the signature form.

@@ -1,5 +1,5 @@
+#include "support/TestModels.h"
 #include "wavemill/json/JsonSerializer.h"
-#include "wavemill/models/Interceptor.h"
 #include "wavemill/models/TextMap.h"
 
 #include <gtest/gtest.h>
@@ -15,9 +15,8 @@ using namespace Corvane::Wavemill;
 // reader sees must be one a writer stored, and the map ends with one pair
 // per key.
 TEST(TextMapConcurrencyTest, ReadersAndWritersShareTheMap) {
-  auto map = std::make_shared<TextMap>();
-  Interceptor interceptor(map);
-  map->activateSettings(&interceptor, nullptr);
+  Testing::LiveTree<TextMap> tree;
+  auto &map = tree.root;
 
   constexpr int keys = 40;
   constexpr int rounds = 20;
@@ -52,9 +51,8 @@ TEST(TextMapConcurrencyTest, ReadersAndWritersShareTheMap) {
 // A recall into the live map rebuilds the index while readers look keys up:
 // a reader never misses a key that is in the map before and after.
 TEST(TextMapConcurrencyTest, RecallRebuildsTheIndexWhileReadersLookUp) {
-  auto map = std::make_shared<TextMap>();
-  Interceptor interceptor(map);
-  map->activateSettings(&interceptor, nullptr);
+  Testing::LiveTree<TextMap> tree;
+  auto &map = tree.root;
   constexpr int keys = 30;
   for (int key = 0; key < keys; ++key)
     map->setItem("k" + std::to_string(key), "v" + std::to_string(key));

@@ -1,6 +1,5 @@
 #include "wavemill/models/TextMap.h"
-#include "wavemill/models/Couplings.h"
-#include "wavemill/models/Interceptor.h"
+#include "support/TestModels.h"
 #include "wavemill/models/ModelContainer.h"
 #include "wavemill/models/TextModel.h"
 
@@ -33,10 +32,10 @@ TEST(TextModelTest, NamesSettingsAndLoadTimeRegistration) {
   EXPECT_TRUE(empty.Value->isDefaultValue());
 }
 
-class TextMapTest : public testing::Test {
+// A live map whose couplings record the method and its two arguments.
+class TextMapTest : public testing::Test, public Testing::LiveTree<TextMap> {
 protected:
   TextMapTest() {
-    map->activateSettings(&interceptor, nullptr);
     map->setCouplings(std::make_shared<Couplings>([this](ModelBase *, Transaction *transaction) {
       ++couples;
       method = transaction->getMethodName();
@@ -45,17 +44,15 @@ protected:
       arguments = (key ? key->toString() : "?") + "=" + (value ? value->toString() : "?");
     }));
   }
-  std::shared_ptr<TextMap> map = std::make_shared<TextMap>();
-  Interceptor interceptor{map};
+  std::shared_ptr<TextMap> &map = root;
   int couples = 0;
   std::string method;
   std::string arguments;
 };
 
-TEST_F(TextMapTest, SetAndGetItems) {
+TEST_F(TextMapTest, SetItemStoresUnderOneKeyInACoupledMethodTransaction) {
   EXPECT_EQ(map->getItem("Unit"), "");
   EXPECT_EQ(map->getTypeName(), "TextMap");
-  EXPECT_EQ(map->Items->getName(), "Items");
 
   map->setItem("Unit", "Hz");
   EXPECT_EQ(couples, 1);
@@ -70,15 +67,13 @@ TEST_F(TextMapTest, SetAndGetItems) {
   EXPECT_EQ(map->getItem("unit"), "");
 
   // Storing the same value again changes nothing but still couples.
-  int changes = 0;
-  auto pair = map->Items->getValue()->getItem(0);
-  auto subscription = pair->Value->getSubject().get_observable().subscribe([&](const SettingChange &) { ++changes; });
+  Testing::Notifications notes;
+  notes.watch(*map->Items->getValue()->getItem(0));
   map->setItem("Unit", "kHz");
-  EXPECT_EQ(changes, 0);
+  EXPECT_TRUE(notes.take().empty());
   EXPECT_EQ(couples, 4);
   map->setItem("Unit", "MHz");
-  EXPECT_EQ(changes, 1);
-  subscription.unsubscribe();
+  EXPECT_EQ(notes.take(), std::vector<std::string>{"setting:Value"});
 }
 
 TEST_F(TextMapTest, IndexFollowsRecallAndCopies) {

@@ -1,7 +1,4 @@
-#include "wavemill/models/Couplings.h"
-#include "wavemill/models/Int32Setting.h"
-#include "wavemill/models/Int64Setting.h"
-#include "wavemill/models/ModelBase.h"
+#include "support/TestModels.h"
 
 #include <gtest/gtest.h>
 
@@ -25,9 +22,9 @@ struct Counters : ModelBase {
 // and the coupling always sees a consistent tree.
 TEST(TransactionConcurrencyTest, WritersAreSerialAndEachOutermostWriteCouplesOnce) {
   constexpr int threads = 4, writesPerThread = 500;
-  auto root = std::make_shared<Counters>();
-  Interceptor tree(root);
-  root->activateSettings(&tree, nullptr);
+  Testing::LiveTree<Counters> live;
+  auto &root = live.root;
+  auto &tree = live.interceptor;
   std::atomic<int> notifications{0};
   int couples = 0; // written only inside the lock
   auto observed = root->a->getSubject().get_observable().subscribe([&](const SettingChange &) { ++notifications; });

@@ -153,8 +153,6 @@ TEST_F(TransactionTest, SyncTransactionGroupsWritesAndCouplesOnceAtTheEnd) {
     EXPECT_THROW(edit->getSettingAt(2), std::out_of_range); // kept: the bound admits the count
   }
   EXPECT_EQ(method, "setPair");
-  EXPECT_EQ(root->beginReset()->getMethodName(), "Reset");
-  EXPECT_EQ(root->beginReset()->getOption(), TransactionOption::Reset);
   EXPECT_EQ(root->beginRecall()->getMethodName(), "Recall");
   EXPECT_EQ(root->beginRecall()->getOption(), TransactionOption::Recall);
 
