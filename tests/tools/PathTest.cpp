@@ -15,7 +15,7 @@
 using namespace Corvane::Wavemill;
 using Corvane::Wavemill::Testing::TempDir;
 
-TEST(PathTest, CombineJoinsWithOneSlashAndKeepsTheOtherSideWhenOneIsEmpty) {
+TEST(PathTest, CombineJoinsWithOneSlashAndFullPathFoldsToTheClassicLength) {
   EXPECT_EQ(Path::combine("a\\", "/b"), "a/b");
   EXPECT_EQ(Path::combine("a//", "\\\\b\\c"), "a/b/c");
   EXPECT_EQ(Path::combine("", "\\b"), "\\b");
@@ -23,9 +23,7 @@ TEST(PathTest, CombineJoinsWithOneSlashAndKeepsTheOtherSideWhenOneIsEmpty) {
   EXPECT_EQ(Path::combine(Path::longPrefix() + "C:\\data", "b"), "\\/\\\\/");
   EXPECT_TRUE(Path::isLong("\\\\?\\C:\\data"));
   EXPECT_FALSE(Path::isLong("\\\\"));
-}
-
-TEST(PathTest, FullPathIsAbsoluteFoldedAndLimitedToTheClassicLength) {
+  // A full path is absolute, folded and limited to the classic length.
   const auto cwd = Tools::getCurrentDirectory();
   EXPECT_EQ(Path::getFullPath("a/./b/../c"), cwd + "/a/c");
   EXPECT_EQ(Path::getFullPath("\\x\\\\y\\..\\z\\"), "/x/z/");
@@ -35,7 +33,7 @@ TEST(PathTest, FullPathIsAbsoluteFoldedAndLimitedToTheClassicLength) {
   EXPECT_EQ(Path::getFullPath(""), "");
 }
 
-TEST(PathTest, NamePartsOfAPath) {
+TEST(PathTest, NamePartsAndParentOfAPath) {
   EXPECT_EQ(Path::getDirectoryName("/data\\logs/a.txt"), "/data/logs");
   EXPECT_EQ(Path::getDirectoryName("/a.txt"), "/");
   EXPECT_EQ(Path::getDirectoryName(""), "");
@@ -44,16 +42,14 @@ TEST(PathTest, NamePartsOfAPath) {
   EXPECT_EQ(Path::splitShortName("x\\libwavemill.so.0.1"),
             std::make_pair(std::string("libwavemill.so.0"), std::string("1")));
   EXPECT_EQ(Path::splitShortName("a.b/noext"), std::make_pair(std::string("noext"), std::string()));
-}
-
-TEST(PathTest, ParentDirectoryStopsAtTheRootGiven) {
+  // The parent stops at the root given.
   EXPECT_EQ(Path::getParentDirectory("/data/logs/today"), "/data/logs/");
   EXPECT_EQ(Path::getParentDirectory("/data/logs/", "/data/logs"), "/data/logs/");
   EXPECT_EQ(Path::getParentDirectory("/"), "/");
   EXPECT_EQ(Path::getParentDirectory(""), "");
 }
 
-TEST(PathTest, PrepareAndCreateDirectoryBuildMissingTreesButNotOverFiles) {
+TEST(PathTest, PrepareAndCreateDirectoryBuildMissingTreesButNotOverFilesAndFileNamesListOneLevel) {
   TempDir dir;
   const auto file = dir.path("a\\b/c.txt");
   EXPECT_EQ(Path::prepare(file), file);
@@ -68,6 +64,12 @@ TEST(PathTest, PrepareAndCreateDirectoryBuildMissingTreesButNotOverFiles) {
   EXPECT_EQ(Path::prepare(dir.path("f/g/h.txt")), "");
   EXPECT_FALSE(Path::createDirectory(""));
   EXPECT_FALSE(Path::createDirectory(dir.path(std::string(300, 'x'))));
+
+  // The entries of one folder, not of its subfolders.
+  auto names = Path::getFileNames(dir.root());
+  std::sort(names.begin(), names.end());
+  EXPECT_EQ(names, (std::vector<std::string>{"a", "f"}));
+  EXPECT_TRUE(Path::getFileNames(dir.path("absent")).empty());
 }
 
 TEST(PathTest, RemoveDirectoryRemovesATreeButNeverASystemFolderAndReportsRefusalsOfTheFileSystem) {
@@ -130,14 +132,4 @@ TEST(PathTest, PerUserAndTemporaryFoldersOfTheProductFamily) {
     EXPECT_EQ(Tools::getTempPath(), expected);
   }
   before == nullptr ? ::unsetenv("TMPDIR") : ::setenv("TMPDIR", saved.c_str(), 1);
-}
-
-TEST(PathTest, FileNamesListsTheEntriesOfOneFolder) {
-  TempDir dir;
-  Path::createDirectory(dir.path("sub/deeper"));
-  Tools::writeText(dir.path("a.txt"), "");
-  auto names = Path::getFileNames(dir.root());
-  std::sort(names.begin(), names.end());
-  EXPECT_EQ(names, (std::vector<std::string>{"a.txt", "sub"}));
-  EXPECT_TRUE(Path::getFileNames(dir.path("absent")).empty());
 }
