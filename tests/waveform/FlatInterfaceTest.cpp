@@ -7,6 +7,7 @@
 #include <gtest/gtest.h>
 
 #include <string>
+#include <vector>
 
 using namespace Corvane::Wavemill;
 using namespace Corvane::Wavemill::Testing;
@@ -120,21 +121,20 @@ TEST(FlatInterfaceTest, NullHandlesAndUnopenedImportersAnswerAsDocumented) {
   EXPECT_EQ(flat.CreateBlockExporter(nullptr, bytes, 16), nullptr);
   flat.DisposeExporter(nullptr);
   flat.stop(nullptr);
-  EXPECT_FALSE(flat.start(nullptr, 10, true));
-  EXPECT_FALSE(flat.stream(nullptr, bytes, bytes, 1, true));
-  EXPECT_FALSE(flat.streamiq(nullptr, bytes, 4));
-  EXPECT_FALSE(flat.streammarker(nullptr, bytes, 1));
   flat.DisposeImporter(nullptr);
   flat.close(nullptr);
-  EXPECT_EQ(flat.GetKey(nullptr), 0);
-  EXPECT_FALSE(flat.Open(nullptr, missing, bytes));
-  EXPECT_EQ(flat.GetHeaderLen(nullptr), -1);
-  EXPECT_EQ(flat.GetHeader(nullptr, bytes, 16), -1);
-  EXPECT_EQ(flat.GetDataLen(nullptr), -1);
-  EXPECT_EQ(flat.GetData(nullptr, bytes, 16), -1);
-  EXPECT_EQ(flat.GetMarkers(nullptr, bytes, 16), -1);
-  EXPECT_EQ(flat.GetWavformFormatFlag(nullptr), -1);
-
+  const std::vector<bool> refused = {flat.start(nullptr, 10, true), flat.stream(nullptr, bytes, bytes, 1, true),
+                                     flat.streamiq(nullptr, bytes, 4), flat.streammarker(nullptr, bytes, 1),
+                                     flat.Open(nullptr, missing, bytes)};
+  EXPECT_EQ(refused, std::vector<bool>(5, false));
+  const std::vector<long long> answers = {flat.GetKey(nullptr),
+                                          flat.GetHeaderLen(nullptr),
+                                          flat.GetHeader(nullptr, bytes, 16),
+                                          flat.GetDataLen(nullptr),
+                                          flat.GetData(nullptr, bytes, 16),
+                                          flat.GetMarkers(nullptr, bytes, 16),
+                                          flat.GetWavformFormatFlag(nullptr)};
+  EXPECT_EQ(answers, (std::vector<long long>{0, -1, -1, -1, -1, -1, -1}));
   CBlockImporter *importer = flat.CreateBlockImporter();
   EXPECT_EQ(flat.GetHeaderLen(importer), -1);
   EXPECT_EQ(flat.GetDataLen(importer), 0);

@@ -1,6 +1,6 @@
 #include "wavemill/waveform/Packager.h"
 
-#include "wavemill/waveform/EncryptKey.h"
+#include "support/WaveformFiles.h"
 
 #include <gtest/gtest.h>
 
@@ -9,18 +9,9 @@
 #include <vector>
 
 using namespace Corvane::Wavemill;
+using namespace Corvane::Wavemill::Testing;
 
 namespace {
-
-using Bytes = std::vector<unsigned char>;
-
-Bytes pattern(std::size_t n, unsigned char first) {
-  Bytes b(n);
-  for (std::size_t i = 0; i < n; ++i) {
-    b[i] = static_cast<unsigned char>(first + i * 3);
-  }
-  return b;
-}
 
 Bytes word(std::uint32_t w) {
   return {static_cast<unsigned char>(w >> 24), static_cast<unsigned char>(w >> 16), static_cast<unsigned char>(w >> 8),
@@ -38,16 +29,12 @@ Bytes join(std::initializer_list<Bytes> parts) {
 // Takes every block, `step` at a time, and decrypts them.
 template <class P> Bytes drain(P &packager, int step) {
   Bytes cipher;
-  std::vector<unsigned char> piece(static_cast<std::size_t>(step) * 16);
+  Bytes piece(static_cast<std::size_t>(step) * 16);
   for (int got = step; got == step;) {
     got = packager.getBlocks(piece.data(), step);
     cipher.insert(cipher.end(), piece.begin(), piece.begin() + got * 16);
   }
-  Bytes plain(cipher.size());
-  Decryptor decryptor;
-  decryptor.init(fixedFileKey);
-  decryptor.process(plain.data(), cipher.data(), static_cast<unsigned int>(cipher.size()));
-  return plain;
+  return cipherBlocks<Decryptor>(fixedFileKey, cipher);
 }
 
 } // namespace
@@ -59,48 +46,25 @@ TEST(PackagerTest, ChunksAreFramedPaddedOrHeldBackByTheirTag) {
     std::size_t body;
     unsigned int pkgSize;
     std::size_t leftoverIn;
-    Bytes delivered; // plain bytes; the body is pattern(body, 0x40), the leftover pattern(n, 0x90)
+    Bytes delivered; // plain bytes
     Bytes heldBack;
   };
-  const Bytes body = pattern(5000, 0x40);
-  const Bytes in = pattern(15, 0x90);
-  auto bodyPart = [&](std::size_t from, std::size_t to) { return Bytes(body.begin() + from, body.begin() + to); };
+  const Bytes body = patternBytes(5000, 0x40);
+  const Bytes in = patternBytes(15, 0x90), in4(in.begin(), in.begin() + 4);
+  auto part = [&](std::size_t from, std::size_t to) { return Bytes(body.begin() + from, body.begin() + to); };
+  auto prefix = [](std::uint32_t tag, std::uint32_t length) { return join({word(tag), word(length)}); };
   const Row rows[] = {
-      {"an empty reader gives the prefix and 8 zeros", 3, 0, 0, 0, join({word(3), word(0), Bytes(8, 0)}), {}},
-      {"8 body bytes fill the first block", 2, 8, 0, 0, join({word(2), word(8), bodyPart(0, 8)}), {}},
-      {"hold-back keeps what follows the last whole block", 2, 20, 100, 0, join({word(2), word(100), bodyPart(0, 8)}),
-       bodyPart(8, 20)},
-      {"a chunk smaller than a block is held back whole", 2, 5, 100, 0, {}, join({word(2), word(100), bodyPart(0, 5)})},
-      {"the last chunk opens with the leftover and pads",
-       32,
-       4,
-       100,
-       4,
-       join({Bytes(in.begin(), in.begin() + 4), bodyPart(0, 4), Bytes(8, 0)}),
-       {}},
-      {"leftover and body making whole blocks leave nothing",
-       16,
-       28,
-       100,
-       4,
-       join({Bytes(in.begin(), in.begin() + 4), bodyPart(0, 28)}),
-       {}},
-      {"a prefix ignores leftovers", 3, 8, 0, 4, join({word(3), word(8), bodyPart(0, 8)}), {}},
-      {"tag 33 writes the word 1 and never holds back",
-       33,
-       20,
-       100,
-       0,
-       join({word(1), word(100), bodyPart(0, 20), Bytes(4, 0)}),
-       {}},
-      {"a continuation across buffer refills", 16, 5000, 100000, 0, bodyPart(0, 4992), bodyPart(4992, 5000)},
-      {"a whole package across buffer refills",
-       34,
-       4990,
-       0,
-       0,
-       join({word(2), word(4990), bodyPart(0, 4990), Bytes(10, 0)}),
-       {}},
+      {"an empty reader gives the prefix and 8 zeros", 3, 0, 0, 0, join({prefix(3, 0), Bytes(8, 0)}), {}},
+      {"8 body bytes fill the first block", 2, 8, 0, 0, join({prefix(2, 8), part(0, 8)}), {}},
+      {"hold-back keeps what follows the last whole block", 2, 20, 100, 0, join({prefix(2, 100), part(0, 8)}),
+       part(8, 20)},
+      {"a chunk smaller than a block is held back whole", 2, 5, 100, 0, {}, join({prefix(2, 100), part(0, 5)})},
+      {"the last chunk opens with the leftover and pads", 32, 4, 100, 4, join({in4, part(0, 4), Bytes(8, 0)}), {}},
+      {"leftover and body making whole blocks leave nothing", 16, 28, 100, 4, join({in4, part(0, 28)}), {}},
+      {"a prefix ignores leftovers", 3, 8, 0, 4, join({prefix(3, 8), part(0, 8)}), {}},
+      {"tag 33 writes tag 1, never holds back", 33, 20, 100, 0, join({prefix(1, 100), part(0, 20), Bytes(4, 0)}), {}},
+      {"a continuation across buffer refills", 16, 5000, 100000, 0, part(0, 4992), part(4992, 5000)},
+      {"a whole package across refills", 34, 4990, 0, 0, join({prefix(2, 4990), part(0, 4990), Bytes(10, 0)}), {}},
   };
   Encryptor encryptor;
   encryptor.init(fixedFileKey);
@@ -119,7 +83,7 @@ TEST(PackagerTest, ChunksAreFramedPaddedOrHeldBackByTheirTag) {
 }
 
 TEST(PackagerTest, ForerunnerWritesItsTagInHostOrderAndBadArgumentsDeliverNothing) {
-  const Bytes body = pattern(3, 1);
+  const Bytes body = patternBytes(3, 1);
   Encryptor encryptor;
   encryptor.init(fixedFileKey);
   Buffer_DataReader reader(const_cast<unsigned char *>(body.data()), 3);
@@ -132,7 +96,7 @@ TEST(PackagerTest, ForerunnerWritesItsTagInHostOrderAndBadArgumentsDeliverNothin
 
   // A header reader over the 16 base bytes alone has a size of 0 but
   // would still hand those bytes out; they must not become the body.
-  Bytes base = pattern(16, 1);
+  Bytes base = patternBytes(16, 1);
   HeaderBuffer_DataReader baseOnly(base.data(), 16);
   WPL_Packager header(&baseOnly, &encryptor, 1, 256, 16, 0, 0, nullptr);
   EXPECT_EQ(drain(header, 4), join({word(1), word(0), Bytes(8, 0)}));
