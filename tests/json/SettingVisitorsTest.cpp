@@ -10,6 +10,8 @@
 #include <gtest/gtest.h>
 
 #include <stdexcept>
+#include <tuple>
+#include <utility>
 #include <vector>
 
 using namespace Corvane::Wavemill;
@@ -62,23 +64,15 @@ TEST(SettingVisitorsTest, WritesKindsLimitsAndFlags) {
   BoolSetting output("Output");
   ModeSetting mode, listed;
   listed.valid = {0, 2};
-  const struct {
-    Setting &setting;
-    const char *part;
-    bool present;
-  } cases[] = {{open, "Min", false},
-               {open, "\"Step\"", false},
-               {count, "\"Min\": 0,", true},
-               {count, "Max", false},
-               {title, "\"$type\": \"StringSetting\",\n  \"MaxLength\": 65536,", true},
-               {title, "\"ReadOnly\": true", true},
-               {output, "\"Value\": false", true},
-               {mode, "ValidValues", false},
-               {listed, "\"$type\": \"EnumSetting\"", true},
-               {listed, "\"ValidValues\": [\n    0,\n    2\n  ]", true},
-               {listed, "\"Value\": \"0\"", true}};
-  for (const auto &c : cases)
-    EXPECT_EQ(written(c.setting).find(c.part) != npos, c.present) << c.setting.getName() << " " << c.part;
+  using Part = std::pair<Setting *, const char *>;
+  for (const auto &[setting, part] :
+       {Part{&open, "Min"}, Part{&open, "\"Step\""}, Part{&count, "Max"}, Part{&mode, "ValidValues"}})
+    EXPECT_EQ(written(*setting).find(part), npos) << setting->getName() << " has " << part;
+  for (const auto &[setting, part] :
+       {Part{&count, "\"Min\": 0,"}, Part{&title, "\"$type\": \"StringSetting\",\n  \"MaxLength\": 65536,"},
+        Part{&title, "\"ReadOnly\": true"}, Part{&output, "\"Value\": false"}, Part{&listed, "\"Value\": \"0\""},
+        Part{&listed, "\"$type\": \"EnumSetting\""}, Part{&listed, "\"ValidValues\": [\n    0,\n    2\n  ]"}})
+    EXPECT_NE(written(*setting).find(part), npos) << setting->getName() << " lacks " << part;
 
   // A setting that is not an enum leaves the previous object in place.
   SettingToJsonVisitor visitor;
@@ -94,11 +88,9 @@ TEST(SettingVisitorsTest, ReadsValuesLimitsAndFlags) {
   // they are, even when the value lies outside.
   read(level, "{\"Value\": 10,\n\"Min\": 12.5,\n\"Max\": 30,\n\"Step\": 0.5,\n\"ReadOnly\": True,\n\"Visible\": "
               "false\n}");
-  EXPECT_EQ(level.getValue(), 10.0);
-  EXPECT_EQ(level.getMinimum(), 12.5);
-  EXPECT_EQ(level.getMaximum(), 30.0);
-  EXPECT_EQ(level.getStep(), 0.5);
-  EXPECT_FALSE(level.isReadOnly());
+  EXPECT_EQ(std::make_tuple(level.getValue(), level.getMinimum(), level.getMaximum(), level.getStep()),
+            std::make_tuple(10.0, 12.5, 30.0, 0.5));
+  EXPECT_FALSE(level.isReadOnly()); // only "true" sets it
   EXPECT_FALSE(level.isVisible());
   read(level, "{\"Value\": 11,\n\"ReadOnly\": true\n}");
   EXPECT_TRUE(level.isReadOnly());
