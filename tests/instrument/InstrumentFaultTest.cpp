@@ -1,7 +1,6 @@
 #include "wavemill/instrument/Instrument.h"
 
 #include "support/TestInstrument.h"
-#include "wavemill/simulator/SimulatedInstrument.h"
 
 #include <gtest/gtest.h>
 
@@ -74,15 +73,14 @@ TEST(InstrumentFaultTest, EveryFaultEndsWithinTheTimeOutWithoutACrash) {
     for (const auto &[operation, expected] : {std::pair{"query", row.query}, std::pair{"queryBlock", row.queryBlock},
                                               std::pair{"sendBlock", row.sendBlock}}) {
       SCOPED_TRACE(toString(row.fault) + " " + operation);
-      SimulatedInstrument simulator;
+      Testing::SimulatedBench bench({}, timeoutInMS);
       std::vector<unsigned char> block(5000, 'x');
-      TestInstrument loader(simulator.getAddress(), timeoutInMS);
-      loader.sendBlock("MMEM:DATA 'w'", block, 0);
-      ASSERT_EQ(loader.query("*OPC?", -1), "1"); // stored before another connection asks for it
-      simulator.setFault(row.fault);
+      bench.instrument->sendBlock("MMEM:DATA 'w'", block, 0);
+      ASSERT_EQ(bench.instrument->query("*OPC?", -1), "1"); // stored before another connection asks for it
+      bench.simulator.setFault(row.fault);
 
       const auto start = std::chrono::steady_clock::now();
-      EXPECT_EQ(run(simulator, operation), expected);
+      EXPECT_EQ(run(bench.simulator, operation), expected);
       EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::milliseconds(timeoutInMS + 1000));
     }
   }
