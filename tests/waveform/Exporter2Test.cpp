@@ -28,14 +28,6 @@ struct WholeExporter : Exporter2 {
   bool streammarker(unsigned char *, int) override { return false; }
 };
 
-Bytes header(int n) {
-  Bytes h(static_cast<std::size_t>(n));
-  for (int k = 0; k < n; ++k) {
-    h[static_cast<std::size_t>(k)] = static_cast<unsigned char>(0xa0 + k);
-  }
-  return h;
-}
-
 // The salt: the low bytes of rand() after srand(t), for a t in [from, to].
 bool saltOfTime(const unsigned char *salt, std::time_t from, std::time_t to) {
   for (std::time_t t = from; t <= to; ++t) {
@@ -60,7 +52,7 @@ TEST(Exporter2Test, FileHoldsHeadHeaderIqAndMarkerPackagesByteForByte) {
   for (const Row &row : rows) {
     SCOPED_TRACE("header " + std::to_string(row.headerLen) + ", samples " + std::to_string(row.samples));
     TempDir dir;
-    const Bytes h = header(row.headerLen);
+    const Bytes h = patternBytes(static_cast<std::size_t>(row.headerLen), 5);
     const auto n = static_cast<std::size_t>(row.samples), channels = static_cast<std::size_t>(row.markerCount);
     std::vector<double> i(n), q(n);
     Bytes markers(n * channels), iq, packed(n);
@@ -106,7 +98,7 @@ TEST(Exporter2Test, FileHoldsHeadHeaderIqAndMarkerPackagesByteForByte) {
 
 TEST(Exporter2Test, SamplesRoundToSixteenBitsAndBadInputIsRefused) {
   TempDir dir;
-  Bytes h = header(16);
+  Bytes h = patternBytes(16, 5);
   WholeExporter exporter(dir.path("w.wv"), h.data(), 16);
   double i[] = {2.0, -2.0, 1.0, 0.5, NAN, 0.0};
   double q[] = {0.0, 1.0, -1.0, 0.00001, 0.0, -0.0};
@@ -141,7 +133,7 @@ TEST(Exporter2Test, SamplesRoundToSixteenBitsAndBadInputIsRefused) {
 
 TEST(Exporter2Test, AFailedWriteIsReportedAndLeavesNoFileAndShortHeaderIsPadded) {
   TempDir dir;
-  Bytes h = header(16);
+  Bytes h = patternBytes(16, 5);
   std::vector<double> v(52'500, 1.0);
   // A full device takes the file head but no data. 52500 samples make a
   // file a little over the 256 KiB stdio buffer: one write fails and the
@@ -162,7 +154,7 @@ TEST(Exporter2Test, AFailedWriteIsReportedAndLeavesNoFileAndShortHeaderIsPadded)
   WholeExporter shortHeader(dir.path("s.wv"), h.data(), 5);
   EXPECT_TRUE(shortHeader.setData(v.data(), v.data(), nullptr, 1, 0));
   const WaveformFile file = openWaveform(dir.path("s.wv"));
-  EXPECT_EQ(Bytes(file.head.begin(), file.head.begin() + 8), Bytes({0xa0, 0xa1, 0xa2, 0xa3, 0xa4, 0, 0, 0}));
+  EXPECT_EQ(Bytes(file.head.begin(), file.head.begin() + 8), Bytes({h[0], h[1], h[2], h[3], h[4], 0, 0, 0}));
   ASSERT_EQ(file.packages.size(), 3u);
   EXPECT_EQ(file.packages[0].length, 0u);
 }

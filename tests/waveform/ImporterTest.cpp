@@ -100,31 +100,31 @@ TEST_F(ImporterTest, EveryRefusalAnswersItsResultAndMessage) {
     std::function<long long(Importer &)> call;
     long long result;
     std::string message;
-  } rows[] = {
-      {"header length before Open", false, [](Importer &m) { return m.GetHeaderLength(); }, -1, invalid},
-      {"samples before Open", false, [](Importer &m) { return m.GetIQDataLen(); }, 0, invalid},
+  };
+#define CALL(...) [&](Importer &m) -> long long { return __VA_ARGS__; }
+  const Row rows[] = {
+      {"header length before Open", false, CALL(m.GetHeaderLength()), -1, invalid},
+      {"samples before Open", false, CALL(m.GetIQDataLen()), 0, invalid},
       {"markers per sample before Open", false, markersPerSample, -5, invalid},
-      {"IQ before Open", false, [&](Importer &m) { return m.GetRawIQData(buffer, 16); }, 0, invalid},
-      {"header before Open", false, [&](Importer &m) { return m.GetHeader(buffer, 40); }, 0, invalid},
-      {"the base class opens nothing", false, [&](Importer &m) { return m.Importer2::Open(path.c_str(), buffer); }, 0,
-       ""},
-      {"a missing file", false, [&](Importer &m) { return m.Open((path + L"x").c_str()); }, 0,
-       "Failed to open the file."},
-      {"header of the wrong size", true, [&](Importer &m) { return m.GetHeader(buffer, 30); }, 0,
+      {"IQ before Open", false, CALL(m.GetRawIQData(buffer, 16)), 0, invalid},
+      {"header before Open", false, CALL(m.GetHeader(buffer, 40)), 0, invalid},
+      {"the base class opens nothing", false, CALL(m.Importer2::Open(path.c_str(), buffer)), 0, ""},
+      {"a missing file", false, CALL(m.Open((path + L"x").c_str())), 0, "Failed to open the file."},
+      {"header of the wrong size", true, CALL(m.GetHeader(buffer, 30)), 0,
        "Error: Incorrect size of header data: total size24 size requested 30"},
-      {"whole IQ of the wrong size", true, [&](Importer &m) { return m.Importer2::GetRawIQData(buffer, 3996); }, 0,
+      {"whole IQ of the wrong size", true, CALL(m.Importer2::GetRawIQData(buffer, 3996)), 0,
        "Error: Incorrect buffer size: need buffer size 4000, input buffer size 3996"},
-      {"decoded IQ of the wrong count", true, [&](Importer &m) { return m.Importer2::GetIQData(values, values, 999); },
-       0, "Error: Incorrect buffer size: need buffer size 1000, input buffer size 999"},
-      {"decoded IQ of the right count, none held", true,
-       [&](Importer &m) { return m.Importer2::GetIQData(values, values, 1000); }, 0, ""},
-      {"unpacked markers of the wrong count", true, [&](Importer &m) { return m.Importer2::GetMarkers(buffer, 1001); },
-       0, "Error: Incorrect number of marker samplea: total samples is 1000 but requested is 1001"},
-      {"packed markers of the wrong count", true, [&](Importer &m) { return m.GetRawMarkers(buffer, 7); }, 0,
+      {"decoded IQ of the wrong count", true, CALL(m.Importer2::GetIQData(values, values, 999)), 0,
+       "Error: Incorrect buffer size: need buffer size 1000, input buffer size 999"},
+      {"decoded IQ of the right count, none held", true, CALL(m.Importer2::GetIQData(values, values, 1000)), 0, ""},
+      {"unpacked markers of the wrong count", true, CALL(m.Importer2::GetMarkers(buffer, 1001)), 0,
+       "Error: Incorrect number of marker samplea: total samples is 1000 but requested is 1001"},
+      {"packed markers of the wrong count", true, CALL(m.GetRawMarkers(buffer, 7)), 0,
        "Error: Incorrect number of marker sample: total samples 1000 requested 7"},
-      {"packed markers freed by Open", true, [&](Importer &m) { return m.GetRawMarkers(buffer, 1000); }, 0, ""},
+      {"packed markers freed by Open", true, CALL(m.GetRawMarkers(buffer, 1000)), 0, ""},
       {"markers per sample once open", true, markersPerSample, 4, ""},
   };
+#undef CALL
   for (const auto &row : rows) {
     SCOPED_TRACE(row.name);
     Importer importer;

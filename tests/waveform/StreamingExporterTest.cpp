@@ -73,29 +73,31 @@ void expectPackages(const WaveformFile &file, std::uint32_t iqTag, const Exporte
   }
 }
 
-// Reads one channel of a file, `piece` bytes at a time, up to `total`.
-struct Reader {
-  std::function<int(unsigned char *, int)> read;
-  int piece;
-  std::size_t total;
-  Bytes got{};
-  // False when the channel is done. A read that the kept surplus serves
-  // alone answers 0 but has delivered its bytes, as a caller counting the
-  // samples knows.
-  bool step() {
-    const auto want = static_cast<int>(std::min<std::size_t>(static_cast<std::size_t>(piece), total - got.size()));
-    if (want == 0) {
-      return false;
+// Reads IQ and markers alternately, `piece` IQ bytes and `piece / 3 + 16`
+// marker bytes at a time, until a read answers 0 or the totals are in. A
+// read that the kept surplus serves alone answers 0 but has delivered its
+// bytes, as a caller counting the samples knows.
+std::pair<Bytes, Bytes> readPiecewise(streamingImporter2 &importer, int piece, const Exported &sent) {
+  std::pair<Bytes, Bytes> got;
+  for (bool more = true; more;) {
+    more = false;
+    for (Bytes *channel : {&got.first, &got.second}) {
+      const bool iq = channel == &got.first;
+      const std::size_t total = iq ? sent.iq.size() : sent.markers.size();
+      const auto want = static_cast<int>(std::min<std::size_t>(iq ? piece : piece / 3 + 16, total - channel->size()));
+      if (want == 0) {
+        continue;
+      }
+      Bytes buffer(static_cast<std::size_t>(want));
+      const int n = iq ? importer.GetRawIQData(buffer.data(), want) : importer.GetMarkers(buffer.data(), want);
+      if (n > 0 || want < 16) {
+        channel->insert(channel->end(), buffer.begin(), buffer.begin() + (n > 0 ? n : want));
+        more = true;
+      }
     }
-    Bytes buffer(static_cast<std::size_t>(want));
-    const int n = read(buffer.data(), want);
-    if (n == 0 && want >= 16) {
-      return false;
-    }
-    got.insert(got.end(), buffer.begin(), buffer.begin() + (n > 0 ? n : want));
-    return true;
   }
-};
+  return got;
+}
 
 } // namespace
 
@@ -136,13 +138,9 @@ TEST(StreamingExporterTest, ChunksOfAnySizeJoinIntoOnePackageEachAndReadBackPiec
     Bytes head(200);
     EXPECT_EQ(importer.GetHeader(head.data(), 200), 200);
     EXPECT_EQ(head, sent.header);
-    Reader iq{[&](unsigned char *d, int n) { return importer.GetRawIQData(d, n); }, row.piece, sent.iq.size()};
-    Reader markers{[&](unsigned char *d, int n) { return importer.GetMarkers(d, n); }, row.piece / 3 + 16,
-                   sent.markers.size()};
-    while (iq.step() | markers.step()) {
-    }
-    EXPECT_TRUE(iq.got == sent.iq);
-    EXPECT_TRUE(markers.got == sent.markers);
+    const auto [iq, markers] = readPiecewise(importer, row.piece, sent);
+    EXPECT_TRUE(iq == sent.iq);
+    EXPECT_TRUE(markers == sent.markers);
   }
 }
 
