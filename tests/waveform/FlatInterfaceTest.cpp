@@ -47,28 +47,26 @@ struct Flat {
   // ::close may also name the system call.
   void (*close)(CBlockImporter *) = find<void (*)(CBlockImporter *)>("_Z5closeP14CBlockImporter");
 
-  // Reads the file with the call order of a flat caller.
-  void read(const std::string &path, Bytes &header, Bytes &iq, Bytes &markers, unsigned int piece) {
+  // Reads the file with the call order of a flat caller, 1000 bytes a read.
+  void expectReadsBack(const std::string &path, const Bytes &header, const Bytes &iq, const Bytes &markers) {
     CBlockImporter *importer = CreateBlockImporter();
     unsigned char key[16];
     FormMaskedFileKey(GetKey(importer), key);
     std::wstring wide = widePath(path);
     ASSERT_TRUE(Open(importer, wide.data(), key));
-    header.resize(static_cast<std::size_t>(GetHeaderLen(importer)));
-    EXPECT_EQ(GetHeader(importer, header.data(), static_cast<unsigned int>(header.size())),
-              static_cast<int>(header.size()));
-    const auto samples = static_cast<std::size_t>(GetDataLen(importer));
+    Bytes got(static_cast<std::size_t>(GetHeaderLen(importer)));
+    EXPECT_EQ(GetHeader(importer, got.data(), static_cast<unsigned int>(got.size())), static_cast<int>(got.size()));
+    EXPECT_EQ(got, header);
+    EXPECT_EQ(static_cast<std::size_t>(GetDataLen(importer)), markers.size());
     EXPECT_EQ(GetWavformFormatFlag(importer), 0);
-    Bytes buffer(piece);
-    for (iq.clear(); iq.size() < 4 * samples;) {
-      const int got = GetData(importer, buffer.data(), piece);
-      ASSERT_GT(got, 0);
-      iq.insert(iq.end(), buffer.begin(), buffer.begin() + got);
-    }
-    for (markers.clear(); markers.size() < samples;) {
-      const int got = GetMarkers(importer, buffer.data(), piece);
-      ASSERT_GT(got, 0);
-      markers.insert(markers.end(), buffer.begin(), buffer.begin() + got);
+    for (auto [read, want] : {std::pair{GetData, &iq}, std::pair{GetMarkers, &markers}}) {
+      Bytes buffer(1000);
+      for (got.clear(); got.size() < want->size();) {
+        const int n = read(importer, buffer.data(), 1000);
+        ASSERT_GT(n, 0);
+        got.insert(got.end(), buffer.begin(), buffer.begin() + n);
+      }
+      EXPECT_EQ(got, *want);
     }
     close(importer);
     DisposeImporter(importer);
@@ -105,11 +103,7 @@ TEST(FlatInterfaceTest, WaveformsWrittenInChunksReadBackThroughTheExportedNames)
 
   for (const char *name : {"a.wv", "b.wv"}) {
     SCOPED_TRACE(name);
-    Bytes gotHeader, gotIq, gotMarkers;
-    flat.read(dir.path(name), gotHeader, gotIq, gotMarkers, 1'000);
-    EXPECT_EQ(gotHeader, header);
-    EXPECT_EQ(gotIq, iq);
-    EXPECT_EQ(gotMarkers, markers);
+    flat.expectReadsBack(dir.path(name), header, iq, markers);
   }
 }
 
