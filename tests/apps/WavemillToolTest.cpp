@@ -9,8 +9,6 @@
 
 #include <charconv>
 #include <cmath>
-#include <cstdint>
-#include <cstring>
 #include <fstream>
 #include <iterator>
 #include <string>
@@ -78,53 +76,28 @@ Samples makeSamples(int count) {
   return s;
 }
 
-// The bytes of `value` as the raw formats hold them: the test machine is
-// little-endian, as they are.
-template <class T> std::string raw(T value) {
-  return std::string(reinterpret_cast<const char *>(&value), sizeof value);
-}
-
-template <class T> double take(const std::string &bytes, std::size_t &at) {
-  T value;
-  std::memcpy(&value, bytes.data() + at, sizeof(T));
-  at += sizeof(T);
-  return static_cast<double>(value);
-}
-
-// The samples in one of the tool's formats; markers in a CSV column when
-// `markerColumn`.
-std::string encode(const Samples &s, const std::string &format, bool markerColumn) {
+// One "I,Q,markers" line per sample.
+std::string csv(const Samples &s) {
   std::string out;
-  for (std::size_t n = 0; n < s.i.size(); ++n) {
-    if (format == "csv")
-      out += number(s.i[n]) + "," + number(s.q[n]) + (markerColumn ? "," + number(s.markers[n]) : "") + "\n";
-    else
-      for (const double v : {s.i[n], s.q[n]})
-        out += format == "f32"   ? raw(static_cast<float>(v))
-               : format == "f64" ? raw(v)
-                                 : raw(static_cast<std::int16_t>(std::lround(v * 32767)));
-  }
+  for (std::size_t n = 0; n < s.i.size(); ++n)
+    out += number(s.i[n]) + "," + number(s.q[n]) + "," + number(s.markers[n]) + "\n";
   return out;
 }
 
-Samples decode(const std::string &bytes, const std::string &format) {
+// The samples of "I,Q,markers" lines after a heading.
+Samples readCsv(const std::string &text) {
   Samples s;
-  std::size_t at = format == "csv" ? bytes.find('\n') + 1 : 0; // after the heading
-  bool lineEnd = false;
-  const auto next = [&]() -> double {
-    if (format != "csv")
-      return format == "f32"   ? take<float>(bytes, at)
-             : format == "f64" ? take<double>(bytes, at)
-                               : take<std::int16_t>(bytes, at) / 32767.0;
-    double value = 0;
-    at = std::from_chars(bytes.data() + at, bytes.data() + bytes.size(), value).ptr - bytes.data() + 1;
-    lineEnd = bytes[at - 1] == '\n';
-    return value;
-  };
-  while (at < bytes.size()) {
-    s.i.push_back(next());
-    s.q.push_back(next());
-    s.markers.push_back(format == "csv" && !lineEnd ? static_cast<int>(next()) : 0);
+  const char *at = text.data() + text.find('\n') + 1;
+  const char *const end = text.data() + text.size();
+  while (at < end) {
+    double i = 0, q = 0;
+    int marker = 0;
+    at = std::from_chars(at, end, i).ptr + 1;
+    at = std::from_chars(at, end, q).ptr + 1;
+    at = std::from_chars(at, end, marker).ptr + 1;
+    s.i.push_back(i);
+    s.q.push_back(q);
+    s.markers.push_back(marker);
   }
   return s;
 }
@@ -136,67 +109,46 @@ std::string markerLines(const std::vector<int> &markers) {
   return out;
 }
 
-TEST(WavemillToolTest, PackInfoUnpackRoundTripCsvAndRawSamples) {
-  struct Row {
-    const char *name;
-    const char *packLine;
-    const char *unpackLine;
-    const char *format;
-    bool markers;
-    const char *storedAs;
-    double tolerance;
-  };
-  const Row rows[] = {
-      {"csv with a marker column", "wavemill wv pack in.csv out.wv --set tag5=demo", "wavemill wv unpack out.wv -",
-       "csv", true, "integer", 0.51 / 32767},
-      {"f32 with a marker file", "wavemill wv pack -f f32 in.f32 out.wv -m in.mkr",
-       "wavemill wv unpack -f f32 out.wv back.f32 -m back.mkr", "f32", true, "integer", 0.51 / 32767},
-      {"i16 from standard input", "cat in.i16 | wavemill wv pack -f i16 - out.wv", "wavemill wv unpack -f i16 out.wv -",
-       "i16", false, "integer", 0.51 / 32767},
-      {"f64 stored as float", "wavemill wv pack -f f64 --float in.f64 out.wv", "wavemill wv unpack -f f64 out.wv -",
-       "f64", false, "float", 1e-7},
-  };
+TEST(WavemillToolTest, PackInfoUnpackRoundTripThroughCsvRawSamplesAndMarkerFiles) {
   const Samples samples = makeSamples(5003);
-  for (const auto &row : rows) {
-    SCOPED_TRACE(row.name);
-    TempDir dir;
-    const std::string format = row.format;
-    writeAll(dir.path("in." + format), encode(samples, format, row.markers && format == "csv"));
-    writeAll(dir.path("in.mkr"), markerLines(samples.markers));
+  TempDir dir;
+  writeAll(dir.path("in.csv"), csv(samples));
+  const Result pack = run(dir, "wavemill wv pack in.csv out.wv --set tag5=demo");
+  ASSERT_EQ(pack.code, 0) << pack.err;
+  EXPECT_EQ(pack.err, ""); // no progress bar: standard error is a file
 
-    const Result pack = run(dir, row.packLine);
-    ASSERT_EQ(pack.code, 0) << pack.err;
-    EXPECT_EQ(pack.err, ""); // no progress bar: standard error is a file
+  const Result info = run(dir, "wavemill wv info out.wv");
+  ASSERT_EQ(info.code, 0) << info.err;
+  EXPECT_NE(info.out.find("samples        5003\n"), std::string::npos) << info.out;
+  EXPECT_NE(info.out.find("format         integer\n"), std::string::npos);
+  EXPECT_NE(info.out.find("markers        present\n"), std::string::npos);
+  const Result json = run(dir, "wavemill wv info --json out.wv");
+  EXPECT_NE(json.out.find("\"samples\": 5003,"), std::string::npos) << json.out;
+  EXPECT_NE(json.out.find("\"tag5\": \"demo  "), std::string::npos);
 
-    const Result info = run(dir, "wavemill wv info out.wv");
-    ASSERT_EQ(info.code, 0) << info.err;
-    EXPECT_NE(info.out.find("samples        5003\n"), std::string::npos) << info.out;
-    EXPECT_NE(info.out.find(std::string("format         ") + row.storedAs + "\n"), std::string::npos);
-    EXPECT_NE(info.out.find(row.markers ? "markers        present\n" : "markers        absent\n"), std::string::npos);
-    const Result json = run(dir, "wavemill wv info --json out.wv");
-    EXPECT_NE(json.out.find("\"samples\": 5003,"), std::string::npos) << json.out;
-    EXPECT_NE(json.out.find("\"tag5\": \"" + std::string(format == "csv" ? "demo  " : "      ")), std::string::npos);
-
-    const Result unpack = run(dir, row.unpackLine);
-    ASSERT_EQ(unpack.code, 0) << unpack.err;
-    const Samples back = decode(format == "f32" ? readAll(dir.path("back.f32")) : unpack.out, format);
-    ASSERT_EQ(back.i.size(), samples.i.size());
-    for (std::size_t n = 0; n < back.i.size(); ++n) {
-      ASSERT_NEAR(back.i[n], samples.i[n], row.tolerance) << "sample " << n;
-      ASSERT_NEAR(back.q[n], samples.q[n], row.tolerance) << "sample " << n;
-    }
-    if (format == "csv") {
-      EXPECT_EQ(back.markers, samples.markers);
-    } else if (format == "f32") {
-      EXPECT_EQ(readAll(dir.path("back.mkr")), markerLines(samples.markers));
-    }
+  const Result unpack = run(dir, "wavemill wv unpack out.wv -");
+  ASSERT_EQ(unpack.code, 0) << unpack.err;
+  const Samples back = readCsv(unpack.out);
+  ASSERT_EQ(back.i.size(), samples.i.size());
+  for (std::size_t n = 0; n < back.i.size(); ++n) {
+    ASSERT_NEAR(back.i[n], samples.i[n], 0.51 / 32767) << "sample " << n;
+    ASSERT_NEAR(back.q[n], samples.q[n], 0.51 / 32767) << "sample " << n;
   }
+  EXPECT_EQ(back.markers, samples.markers);
+
+  // Out as f32 with a marker file and in again from standard input: the
+  // stored integers, and so the text, come back the same.
+  const Result raw = run(dir, "{ wavemill wv unpack -f f32 out.wv back.f32 -m back.mkr && cat back.f32 | wavemill wv "
+                              "pack -f f32 - again.wv -m back.mkr && wavemill wv unpack again.wv -; }");
+  ASSERT_EQ(raw.code, 0) << raw.err;
+  EXPECT_EQ(readAll(dir.path("back.mkr")), markerLines(samples.markers));
+  EXPECT_EQ(raw.out, unpack.out);
 }
 
 TEST(WavemillToolTest, DrawsProgressOnlyOnATerminalAndNotWithQuiet) {
   // The input arrives in two parts a second apart, so the transfer outlasts
   // the half second before a bar is drawn.
-  const std::string pack = "(head -c 400000 in.i16; sleep 1; tail -c +400001 in.i16) | wavemill wv pack -f i16 - ";
+  const std::string pack = "(head -c 400000 in.csv; sleep 1; tail -c +400001 in.csv) | wavemill wv pack - ";
   struct Row {
     std::string commandLine;
     bool drawn;
@@ -207,7 +159,7 @@ TEST(WavemillToolTest, DrawsProgressOnlyOnATerminalAndNotWithQuiet) {
       {pack + "file.wv", false},
   };
   TempDir dir;
-  writeAll(dir.path("in.i16"), encode(makeSamples(200000), "i16", false));
+  writeAll(dir.path("in.csv"), csv(makeSamples(30000)));
   for (const auto &row : rows) {
     SCOPED_TRACE(row.commandLine);
     const Result result = run(dir, row.commandLine);
@@ -255,14 +207,11 @@ TEST(WavemillToolTest, CommandsPrintTheirAnswerOrOneLineOfFailureAndLeaveNoOutpu
        ""},
       {"wavemill scpi " + address + " --block up.bin \"MMEM:DATA 'w'\" --read-block down.bin \"MMEM:DATA? 'w'\"", 0, "",
        ""},
-      {visa + "wavemill scpi TCPIP0::127.0.0.1::inst0::INSTR --read-block visa.bin \"MMEM:DATA? 'w'\"", 0, "", ""},
       {corvisa + "wavemill find", 0, "TCPIP0::127.0.0.1::inst0::INSTR\nASRL1::INSTR\n", ""},
-      {corvisa + "wavemill find 'ASRL?*'", 0, "ASRL1::INSTR\n", ""},
       {corvisa + "wavemill find 'GPIB?*'", 1, "", "wavemill: no VISA resources match GPIB?* (wavemill find '?*' "},
       {"WAVEMILL_VISA_LIBRARY=/nonexistent/libvisa.so wavemill find", 1, "",
        "wavemill: no VISA resources found (is a VISA library installed? see WAVEMILL_VISA_LIBRARY)\n"},
       {"wavemill scpi -t 1000 " + closed + " '*IDN?'", 1, "", "wavemill: cannot connect to " + closed + "\n"},
-      {"wavemill identify -t 1000 " + closed, 1, "", "wavemill: cannot connect to " + closed + "\n"},
       {"wavemill scpi -t 300 " + address + " 'FREQ 1e9' 'NOPE?'", 1, "",
        "wavemill: no answer to 'NOPE?' from " + address + " within 300 ms\n"},
       {"wavemill scpi " + address + " --block missing.bin 'MMEM:DATA \"w\"'", 1, "",
@@ -270,7 +219,6 @@ TEST(WavemillToolTest, CommandsPrintTheirAnswerOrOneLineOfFailureAndLeaveNoOutpu
       {"wavemill scpi " + address, 2, "", "wavemill: COMMAND is required\n"},
       {"wavemill scpi " + address + " --read-block x.bin 'FREQ 1e9'", 2, "", "wavemill: --read-block needs a query"},
       {"wavemill identify TCPIP0::127.0.0.1::99999999999::SOCKET", 2, "", "wavemill: not an instrument address: "},
-      {"wavemill wv pack missing.csv out.wv", 1, "", "wavemill: cannot open missing.csv" + noFile},
       {"wavemill wv pack bad.csv out.wv", 1, "", "wavemill: bad.csv:4: not a number: 'x'\n"},
       {"wavemill wv pack loud.csv out.wv", 1, "", "wavemill: loud.csv:2: value outside -1..1 (use --normalize"},
       {"wavemill wv pack good.csv out.wv -m short.mkr", 1, "", "wavemill: short.mkr holds fewer marker values"},
@@ -280,7 +228,6 @@ TEST(WavemillToolTest, CommandsPrintTheirAnswerOrOneLineOfFailureAndLeaveNoOutpu
       {"wavemill wv pack good.csv", 2, "", "wavemill: OUT is required\n"},
       {"wavemill wv pack good.csv out.wv --format wav", 2, "", "wavemill: --format: "},
       {"wavemill wv pack good.csv out.wv --set nope=1", 2, "", "wavemill: --set: no header field called 'nope'"},
-      {"wavemill wv pack good.csv out.wv --set tag7=256", 2, "", "wavemill: --set tag7: expected an integer from 0 to"},
       {"wavemill frobnicate", 2, "", "wavemill: 'frobnicate' is no wavemill command\n"},
       {"wavemill sim --fault wobble", 2, "", "wavemill: --fault: unknown mode 'wobble'"},
   };
@@ -308,7 +255,6 @@ TEST(WavemillToolTest, CommandsPrintTheirAnswerOrOneLineOfFailureAndLeaveNoOutpu
   const auto stored = simulator.getBlock("w");
   EXPECT_EQ(std::string(stored.begin(), stored.end()), block);
   EXPECT_EQ(readAll(dir.path("down.bin")), block);
-  EXPECT_EQ(readAll(dir.path("visa.bin")), block);
   EXPECT_EQ(simulator.getValue("FREQ"), "1e9"); // the command before the failed query went through
 }
 
