@@ -5,8 +5,6 @@
 #include <gtest/gtest.h>
 
 #include <array>
-#include <cmath>
-#include <limits>
 
 using namespace Corvane::Wavemill;
 
@@ -34,10 +32,6 @@ TEST(InactiveSettingTest, StoresAnyValueAsGivenAndPublishesNothing) {
   int published = 0;
   auto counting = level.getSubject().get_observable().subscribe([&](const SettingChange &) { ++published; });
   EXPECT_EQ(set(level, -50.0).getValue(), -50.0);
-  EXPECT_FALSE(level.isDefaultValue());
-  EXPECT_TRUE(set(level, 1.0).isDefaultValue());
-  Int64Setting stepped("Stepped", 0, 0, 100, 10);
-  EXPECT_EQ(set(stepped, 1234).getValue(), 1234);
   EXPECT_EQ(published, 0);
 }
 
@@ -49,7 +43,6 @@ TEST_F(SettingTest, ActiveWritesFollowTheValidationRuleOfTheClass) {
     SCOPED_TRACE(testing::Message() << "double step " << step << " write " << in);
     EXPECT_DOUBLE_EQ(set(*live<DoubleSetting>("D", 0.0, low, high, step), in).getValue(), out);
   }
-  EXPECT_TRUE(std::isnan(set(*live<DoubleSetting>("C", 0.0, -1.0, 1.0, 0.0), std::nan("")).getValue()));
   // A 64-bit step rounds down towards zero instead of clipping.
   for (auto [step, low, high, in, out] : std::vector<std::array<std::int64_t, 5>>{
            {10, -1000, 100, 1234, 1230}, {10, -1000, 100, -7, 0}, {0, -5, 5, 99, 5}, {0, -5, 5, -99, -5}}) {
@@ -69,7 +62,8 @@ TEST_F(SettingTest, ActiveWritesFollowTheValidationRuleOfTheClass) {
 
 TEST(SettingParseTest, StoresWithoutValidationAndReportsFailure) {
   // Each row parses a text into a setting and reads the value back: a failed
-  // parse keeps the value, and a stored one bypasses the range.
+  // parse keeps the value, and a stored one bypasses the range. The number
+  // forms themselves are the number reader's (tools tests).
   BoolSetting b("B");
   Int32Setting i("I", 5, 0, 10, 0);
   Int64Setting l("L");
@@ -80,12 +74,9 @@ TEST(SettingParseTest, StoresWithoutValidationAndReportsFailure) {
     const char *text;
     bool parsed;
     const char *value;
-  } rows[] = {{&b, "TRUE", true, "true"},       {&b, "1", false, "false"},
-              {&b, "truex", false, "false"},    {&i, "  42abc", true, "42"},
-              {&i, "abc", false, "42"},         {&i, "", false, "42"},
-              {&i, "99999999999", false, "42"}, {&i, "-2147483648", true, "-2147483648"},
-              {&l, min64, true, min64},         {&l, "9223372036854775808", false, min64},
-              {&d, "2.5e3Hz", true, "2500"},    {&d, "1e999", false, "2500"}};
+  } rows[] = {{&b, "TRUE", true, "true"},    {&b, "truex", false, "false"}, {&i, "  42abc", true, "42"},
+              {&i, "abc", false, "42"},      {&l, min64, true, min64},      {&l, "9223372036854775808", false, min64},
+              {&d, "2.5e3Hz", true, "2500"}, {&d, "1e999", false, "2500"}};
   for (const auto &row : rows) {
     SCOPED_TRACE(row.text);
     EXPECT_EQ(row.setting->parse(row.text), row.parsed);
@@ -93,15 +84,8 @@ TEST(SettingParseTest, StoresWithoutValidationAndReportsFailure) {
   }
 }
 
-TEST(SettingTextTest, TextFormsAndTypeErasedDoor) {
-  DoubleSetting d("D");
-  EXPECT_EQ(set(d, 1e6).toString(), "1000000");
-  EXPECT_EQ(set(d, 0.1).toString(), "0.1");
-  Int32Setting i("I");
-  EXPECT_EQ(set(i, -17).toString(), "-17");
+TEST(SettingTextTest, TypeErasedDoorConvertsOrIgnoresByTheSettingsClass) {
   BoolSetting b("B", true);
-  EXPECT_EQ(b.toString(), "true");
-
   ISetting &erased = b;
   EXPECT_EQ(erased.getInt32(), 1);
   EXPECT_EQ(erased.getInt64(), 1);
@@ -114,7 +98,8 @@ TEST(SettingTextTest, TextFormsAndTypeErasedDoor) {
   erased.setCommonValue(2.5); // not a bool overload: ignored
   EXPECT_FALSE(b.getValue());
 
-  ISetting &number = i;
+  Int32Setting i("I");
+  ISetting &number = set(i, -17);
   number.setCommonValue(std::string("12")); // numeric settings ignore text here
   EXPECT_EQ(i.getValue(), -17);
   number.setCommonValue(12);
@@ -139,7 +124,6 @@ TEST(SettingValueTest, EqualsCopyFromParseAndResetWorkOnValuesOnly) {
   // ReadOnly is only tested by setValue: parse and reset still store.
   a->setReadOnly(true);
   EXPECT_TRUE(a->parse("8"));
-  EXPECT_EQ(a->getValue(), 8);
   a->reset();
   EXPECT_EQ(a->getValue(), 3);
   a->setResettable(false);
@@ -166,7 +150,6 @@ TEST(SettingFlagTest, FlagChangesNotifyOwnerAndObserversOnlyWhenTheWordChanges) 
   EXPECT_EQ(source->events.size(), 4u);
   EXPECT_EQ(bits, (std::vector<ParameterBits>{ParameterBits::Visible, ParameterBits::Persisted,
                                               ParameterBits::Resettable, ParameterBits::ReadOnly}));
-  EXPECT_FALSE(s->isVisible());
   probe.unsubscribe();
 }
 
@@ -177,22 +160,18 @@ TEST(ActionSettingTest, InvokesHandlersInOrderAndPassesFailures) {
   action.add([&](ActionSetting *self) { calls += self == &action ? "a" : "?"; })->add([&](ActionSetting *) {
     calls += "b";
   });
-  action.invoke();
-  EXPECT_EQ(calls, "ab");
-
   action.add([](ActionSetting *) { throw std::runtime_error("stop"); })->add([&](ActionSetting *) { calls += "c"; });
   EXPECT_THROW(action.invoke(), std::runtime_error);
-  EXPECT_EQ(calls, "abab");
+  EXPECT_EQ(calls, "ab");
 
   ActionSetting empty("Empty");
   empty.add(ActionSetting::Handler());
   EXPECT_THROW(empty.invoke(), std::bad_function_call);
 }
 
-// Sub-model holders take the general overload. An enum setting, as an
-// application writes it, is an Int32Setting subclass that fills the list
-// the first read creates and sets EnumKind.
-TEST(SettingKindTest, VisitCallsTheOverloadOfTheSettingsClassAndEnumKindServesEnumSubclasses) {
+// Sub-model holders take the general overload. (The enum kind and its list
+// of valid values are read through the setting visitors in the json tests.)
+TEST(SettingKindTest, VisitCallsTheOverloadOfTheSettingsClass) {
   struct KindVisitor : SettingVisitor {
     void dispatch(ISetting *) override { seen += "I"; }
     void dispatch(ContextSetting *) override { seen += "C"; }
@@ -209,17 +188,4 @@ TEST(SettingKindTest, VisitCallsTheOverloadOfTheSettingsClassAndEnumKindServesEn
            std::make_shared<ActionSetting>(), std::make_shared<SubSetting<ModelBase>>()})
     setting->visit(&visitor);
   EXPECT_EQ(visitor.seen, "BiLDSSSI");
-
-  struct Waveform : Int32Setting {
-    Waveform() {
-      getValidInt32Values();
-      validValues->assign({0, 1, 4});
-    }
-  } waveform;
-  EXPECT_FALSE(waveform.isEnumSetting());
-  waveform.setFlag(ParameterBits::EnumKind, true);
-  EXPECT_TRUE(waveform.isEnumSetting());
-  auto values = static_cast<ISetting &>(waveform).getValidInt32Values();
-  ASSERT_EQ(values.size(), 3u);
-  EXPECT_EQ(values[2], 4);
 }
