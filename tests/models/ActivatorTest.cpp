@@ -47,8 +47,6 @@ using namespace RegistryTests;
 TEST(ActivatorTest, ShortTypeNames) {
   const std::pair<const char *, const char *> table[] = {
       {"Corvane.Wavemill.TextModel, Ns.Lib", "TextModel"},
-      {"Models.TextModel", "TextModel"},
-      {"TextModel", "TextModel"},
       {"Models.ModelCollection`1[[Models.TextModel]]", "ModelCollection`1[[TextModel]]"},
       {"System.Collections.ObjectModel.Collection`1[[Corvane.Wavemill.TextModel, Ns.Lib]], mscorlib",
        "Collection`1[[TextModel]]"},
@@ -84,7 +82,6 @@ TEST(ActivatorTest, NamesGoOutAndObjectsComeBack) {
   EXPECT_EQ(activator.toName(Prototype::getInstance<Foo>()), "RegistryTests.Foo");
   activator.updateFullTypeNames("Asm", "Ns");
 
-  EXPECT_EQ(activator.toName(std::make_shared<Foo>()), "Ns.Foo, Asm");
   EXPECT_EQ(activator.getFullTypeName(std::make_shared<TextModel>()), "Ns.TextModel, Asm");
   for (const char *name : {"Ns.Foo, Asm", "Other.Foo, Lib", "Models.Foo", "Foo", "RegistryTests.Foo"}) {
     auto made = activator.toInstance(name);
