@@ -3,11 +3,15 @@
 #include "wavemill/waveform/EncryptKey.h"
 #include "wavemill/waveform/Encryptor.h"
 
+#include <gtest/gtest.h>
+#include <openssl/evp.h>
+#include <openssl/sha.h>
+
 #include <cstdint>
 #include <fstream>
-#include <functional>
 #include <iterator>
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace Corvane::Wavemill::Testing {
@@ -110,20 +114,36 @@ struct WaveformFile {
   std::vector<Package> packages;
 };
 
-/// `decrypt(key, cipher)` is AES-128-ECB under the 16-byte key and
-/// `dataKey(plainHead)` derives the data key, so the same walk serves the
-/// library's cipher and an independent one.
-inline WaveformFile openWaveform(const std::string &path,
-                                 const std::function<Bytes(const unsigned char *, const Bytes &)> &decrypt,
-                                 const std::function<Bytes(const Bytes &)> &dataKey, const unsigned char *fileKey) {
+/// AES-128-ECB decryption by OpenSSL: the files the library writes are read
+/// back by a cipher, and a key derivation, that owe nothing to it.
+inline Bytes opensslDecrypt(const unsigned char *key, const Bytes &cipher) {
+  Bytes plain(cipher.size());
+  EVP_CIPHER_CTX *ctx = EVP_CIPHER_CTX_new();
+  EVP_DecryptInit_ex(ctx, EVP_aes_128_ecb(), nullptr, key, nullptr);
+  EVP_CIPHER_CTX_set_padding(ctx, 0);
+  int length = 0;
+  EVP_DecryptUpdate(ctx, plain.data(), &length, cipher.data(), static_cast<int>(cipher.size()));
+  EVP_CIPHER_CTX_free(ctx);
+  plain.resize(static_cast<std::size_t>(length));
+  return plain;
+}
+
+/// Takes the file at `path` apart: the head under the file key, spelled out
+/// here so that the check does not borrow it, and the rest under the first
+/// 16 bytes of the SHA-1 of the plain head.
+inline WaveformFile openWaveform(const std::string &path) {
+  static const unsigned char headKey[16] = {0x54, 0x0a, 0x1e, 0x71, 0x2a, 0xba, 0x28, 0x70,
+                                            0xe9, 0x7b, 0x16, 0x19, 0x97, 0xe2, 0x99, 0xe0};
   const Bytes raw = readBytes(path);
   WaveformFile file;
   file.size = raw.size();
   if (raw.size() < 32) {
     return file;
   }
-  file.head = decrypt(fileKey, Bytes(raw.begin(), raw.begin() + 32));
-  const Bytes plain = decrypt(dataKey(file.head).data(), Bytes(raw.begin() + 32, raw.end()));
+  file.head = opensslDecrypt(headKey, Bytes(raw.begin(), raw.begin() + 32));
+  Bytes dataKey(SHA_DIGEST_LENGTH);
+  SHA1(file.head.data(), 32, dataKey.data());
+  const Bytes plain = opensslDecrypt(dataKey.data(), Bytes(raw.begin() + 32, raw.end()));
   auto word = [&](std::size_t at) {
     return std::uint32_t{plain[at]} << 24 | std::uint32_t{plain[at + 1]} << 16 | std::uint32_t{plain[at + 2]} << 8 |
            plain[at + 3];
@@ -146,11 +166,31 @@ inline WaveformFile openWaveform(const std::string &path,
   return file;
 }
 
-/// `openWaveform` with the library's own cipher and key derivation.
-inline WaveformFile openWaveform(const std::string &path) {
-  return openWaveform(
-      path, [](const unsigned char *key, const Bytes &cipher) { return cipherBlocks<Decryptor>(key, cipher); },
-      dataKeyOf, fixedFileKey);
+/// Expects the file at `path` to be laid out byte for byte as the exporters
+/// write it: the first 16 bytes of `header` around two salts in the head,
+/// then the header package (tag 1, the rest of `header`), the IQ package and
+/// the marker package (tag 3), each with its length word, whole body and zero
+/// padding, and nothing more. Answers the file for further checks.
+inline WaveformFile expectWaveform(const std::string &path, const Bytes &header, const Bytes &iq, const Bytes &markers,
+                                   std::uint32_t iqTag = 2) {
+  const WaveformFile file = openWaveform(path);
+  EXPECT_EQ(file.size, 32 + pad(8 + header.size() - 16) + pad(8 + iq.size()) + pad(8 + markers.size()));
+  if (file.head.size() < 32 || file.packages.size() != 3) {
+    ADD_FAILURE() << path << " holds " << file.packages.size() << " packages";
+    return file;
+  }
+  EXPECT_EQ(Bytes(file.head.begin(), file.head.begin() + 8), Bytes(header.begin(), header.begin() + 8));
+  EXPECT_EQ(Bytes(file.head.begin() + 16, file.head.begin() + 24), Bytes(header.begin() + 8, header.begin() + 16));
+  const Bytes headerBody(header.begin() + 16, header.end());
+  const std::pair<std::uint32_t, const Bytes *> expected[] = {{1, &headerBody}, {iqTag, &iq}, {3, &markers}};
+  for (std::size_t k = 0; k < 3; ++k) {
+    SCOPED_TRACE("package " + std::to_string(k));
+    EXPECT_EQ(file.packages[k].tag, expected[k].first);
+    EXPECT_EQ(file.packages[k].length, expected[k].second->size());
+    EXPECT_TRUE(file.packages[k].body == *expected[k].second);
+    EXPECT_TRUE(file.packages[k].zeroPadded);
+  }
+  return file;
 }
 
 } // namespace Corvane::Wavemill::Testing

