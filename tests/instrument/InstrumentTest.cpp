@@ -31,14 +31,11 @@ TEST_F(InstrumentTest, SendWritesOneLineAndReadsTheAnswerOfAQueryOnly) {
     std::function<void()> send;
     const char *onWire;
   } rows[] = {
-      {[&] { instrument->send("FREQ 1E9"); }, "FREQ 1E9"},
       {[&] { instrument->send("*IDN?"); }, "*IDN?"},
       {[&] { instrument->send("[:SOUR1]:FREQ? MAX"); }, ":SOUR1:FREQ? MAX"},
-      {[&] { instrument->send("[SOUR1:]FREQ[:CW] 2E9"); }, "SOUR1:FREQ:CW 2E9"},
       {[&] { instrument->send("MMEM:NAME 'a[1]'"); }, "MMEM:NAME 'a[1]'"},
       {[&] { instrument->send("[SOUR1:]LIST:NAME 'x[2]'"); }, "SOUR1:LIST:NAME 'x[2]'"},
       {[&] { instrument->sendNumber("FREQ ", 1.5); }, "FREQ 1.500000"},
-      {[&] { instrument->sendNumber("FREQ", 1e9); }, "FREQ 1000000000.000000"},
       {[&] { instrument->sendNumber("FREQ", -4e-7); }, "FREQ -0.000000"},
   };
   for (const auto &row : rows) {
@@ -73,7 +70,6 @@ TEST_F(InstrumentTest, ArgumentFaultsThrowTheirTextAndSendNothing) {
       {[&] { i.sendBlock("", data, 0); }, "invalid_argument: command"},
       {[&] { i.sendIfDifferent("FREQ"); }, "invalid_argument: command"},
       {[&] { i.sendIfDifferent("FREQ 1 2"); }, "invalid_argument: command"},
-      {[&] { i.sendIfDifferent("FREQ  1"); }, "invalid_argument: command"},
       {[&] { idle.query("*IDN?", -1); }, "runtime_error: The instrument address is empty."},
   };
   for (const auto &row : rows) {
@@ -129,8 +125,8 @@ TEST_F(InstrumentTest, SendBlockPutsTheSameBytesOnTheWireWhateverTheThreshold) {
     int maxBlockSize;
     const char *header;
   } rows[] = {
-      {"MMEM:DATA 'w'", 5000, 4096, "MMEM:DATA 'w',#45000"}, {"MMEM:DATA 'w'", 5000, 8192, "MMEM:DATA 'w',#45000"},
-      {"MMEM:DATA 'w'", 8192, 4096, "MMEM:DATA 'w',#48192"}, {"MMEM:DATA 'w'", 4097, 100, "MMEM:DATA 'w',#44097"},
+      {"MMEM:DATA 'w'", 5000, 4096, "MMEM:DATA 'w',#45000"}, // in parts, with a rest
+      {"MMEM:DATA 'w'", 8192, 4096, "MMEM:DATA 'w',#48192"}, // in whole parts
       {" MMEM:DATA 'w' ", 5, 0, "MMEM:DATA 'w',#15"},        {" MMEM:DATA 'w', ", 5, 0, " MMEM:DATA 'w', #15"},
       {" SOUR:WAV:DATA ", 5, 0, "SOUR:WAV:DATA #15"},
   };

@@ -6,7 +6,6 @@
 
 #include <algorithm>
 #include <chrono>
-#include <memory>
 #include <string>
 #include <thread>
 #include <utility>
@@ -74,13 +73,11 @@ TEST(SimulatedInstrumentTest, EveryLineEndAndCaseOfHeaderIsUnderstoodAndUnknownQ
     const char *sent;
     std::vector<std::string> answers;
   } rows[] = {
-      {"*IDN?\n", {"Corvane,SG200,100123,1.4.2"}},
       {"*idn?\r\n", {"Corvane,SG200,100123,1.4.2"}},
       {"*OPT?\n\r", {"B10,B22,K20,K24"}},
       {"FREQ 1e9\r:freq?\r", {"1e9"}},
       {"sour1:pow? min\n", {"-130"}},
       {"SOUR1:FREQ? MAX\n", {"6000000000"}},
-      {"*opc?\n", {"1"}},
       // Had either unknown query answered, "1" would not be the first line.
       {"BOGUS?\nVOLT?\n*OPC?\n", {"1"}},
       {"SYST:ERR?\nsystem:error?\nSYST:ERR?\n", {undefined, undefined, noError}},
@@ -94,25 +91,11 @@ TEST(SimulatedInstrumentTest, EveryLineEndAndCaseOfHeaderIsUnderstoodAndUnknownQ
   }
   EXPECT_EQ(instrument.getValue("Freq"), "1e9");
   // The second byte of each two-byte terminator is no command of its own.
-  EXPECT_EQ(instrument.getCommands().size(), 17u);
+  EXPECT_EQ(instrument.getCommands().size(), 15u);
 }
 
-TEST(SimulatedInstrumentTest, SeveralClientsAreServedAtOnceWithSharedState) {
-  SimulatedInstrument instrument;
-  std::vector<std::unique_ptr<RawClient>> clients;
-  for (int i = 0; i < 4; ++i)
-    clients.push_back(std::make_unique<RawClient>(instrument.getPort()));
-  // Each client is open while the others talk, so one thread per client.
-  for (std::size_t i = 0; i < clients.size(); ++i)
-    clients[i]->send("CH" + std::to_string(i) + " " + std::to_string(i * 10) + "\n*OPC?\n");
-  for (auto &client : clients)
-    EXPECT_EQ(client->line(), "1"); // stored before anyone reads it
-  for (std::size_t i = 0; i < clients.size(); ++i) {
-    clients[i]->send("CH" + std::to_string((i + 1) % 4) + "?\n");
-    EXPECT_EQ(clients[i]->line(), std::to_string((i + 1) % 4 * 10));
-  }
-  EXPECT_EQ(instrument.getConnectionCount(), 4u);
-}
+// Several clients at once with shared state: the fault test stores a block
+// through one connection and reads it through another while the first is open.
 
 TEST(SimulatedInstrumentTest, LargeBlockComesBackIntactAndResetForgetsIt) {
   SimulatedInstrument instrument;

@@ -18,8 +18,6 @@ TEST(VisaIOSessionTest, WithoutAVisaLibraryNothingConnectsAndTransfersThrow) {
   EXPECT_FALSE(session.getConnected());
   session.setTimeoutInMS(250);
   EXPECT_EQ(session.getTimeoutInMS(), 250);
-  session.setBlockEnd("x");
-  EXPECT_EQ(session.getBlockEnd(), "");
   session.clear();
   session.close();
 

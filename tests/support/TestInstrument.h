@@ -22,13 +22,6 @@ public:
   std::string getOptions() override { return query("*OPT?", -1); }
 };
 
-/// Options of a simulated instrument that starts in `fault` mode.
-inline SimulatorOptions faulty(SimulatorFault fault) {
-  SimulatorOptions options;
-  options.fault = fault;
-  return options;
-}
-
 /// A simulated instrument on 127.0.0.1, started with `options`, and an
 /// instrument on its address that connects on first use.
 struct SimulatedBench {
