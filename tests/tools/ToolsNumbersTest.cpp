@@ -17,13 +17,9 @@ using namespace Corvane::Wavemill;
 using Corvane::Wavemill::Testing::thrown;
 
 TEST(ToolsTest, ParseFunctionsTakeTheLeadingNumberOrAnswerTheDefaultOrLeaveTheValueAlone) {
-  EXPECT_EQ(Tools::parseInt32("", 7), 7);
   EXPECT_EQ(Tools::parseInt32("12345678901", 7), 7);
   EXPECT_EQ(Tools::parseInt32(" 42abc", 7), 42);
   EXPECT_EQ(Tools::parseInt64("9000000000", 0), 9000000000);
-  EXPECT_EQ(Tools::parseInt64("99999999999999999999", 5), 5);
-  EXPECT_EQ(Tools::parseDouble("2.5V", 0), 2.5);
-  EXPECT_EQ(Tools::parseDouble("1e999", -1), -1);
   EXPECT_EQ(Tools::parseFloat("0.25", 0), 0.25F);
   EXPECT_EQ(Tools::parseFloat("1e39", 3), 3.0F);
 
@@ -41,48 +37,47 @@ TEST(ToolsTest, ParseFunctionsTakeTheLeadingNumberOrAnswerTheDefaultOrLeaveTheVa
 
 TEST(ToolsTest, TryParseDoubleRefusesWhatTheFilterRejectsAndPassesConversionFailuresOn) {
   double value = -1;
-  for (const char *text : {"", "1e5e3", "e5", "1..2", "+-1", "1.5e3.0", "1,5", "0x10", "inf"})
+  for (const char *text : {"", "1e5e3", "e5", "1..2", "+-1", "1-2", ".-1", "1,5", "1e+-3", "1e3-"})
     EXPECT_FALSE(Tools::tryParse(text, value)) << text;
   EXPECT_EQ(value, -1);
-  EXPECT_TRUE(Tools::tryParse("5e", value));
-  EXPECT_EQ(value, 5);
-  EXPECT_TRUE(Tools::tryParse("1 2", value));
-  EXPECT_EQ(value, 1);
-  EXPECT_TRUE(Tools::tryParse(" -1.5E-3", value));
-  EXPECT_EQ(value, -1.5e-3);
-
-  for (const char *text : {"-", "- 1", "."})
-    EXPECT_EQ(thrown([&] { Tools::tryParse(text, value); }), "invalid_argument: invalid stod argument") << text;
+  const std::pair<const char *, double> accepted[] = {{"5e", 5}, {"1 2", 1}, {" -1.5E-3", -1.5e-3}};
+  for (const auto &[text, number] : accepted) {
+    EXPECT_TRUE(Tools::tryParse(text, value)) << text;
+    EXPECT_EQ(value, number) << text;
+  }
+  EXPECT_EQ(thrown([&] { Tools::tryParse("- 1", value); }), "invalid_argument: invalid stod argument");
   EXPECT_EQ(thrown([&] { Tools::tryParse("1e999", value); }), "out_of_range: stod argument out of range");
 }
 
 // Each row: value, low, high, step and the result.
-TEST(ToolsTest, ClipFormsDifferInGridOriginAndDirection) {
+TEST(ToolsTest, ClipAndRoundFormsDifferInGridOriginDirectionAndHalves) {
   EXPECT_EQ(Tools::clip(-2.0F, -1.0F, 1.0F), -1.0F);
   EXPECT_EQ(Tools::clip(0.5F, -1.0F, 1.0F), 0.5F);
   // The double form takes the nearest multiple of the step counted from zero.
-  const std::array<double, 5> reals[] = {{7, 0, 10, 4, 8},   {-1, 0, 10, 4, 0},    {3, 1, 10, 4, 4},
+  const std::array<double, 5> reals[] = {{7, 0, 10, 4, 8},   {-1, 0, 10, 4, 0},    {11, 0, 10, 4, 10},
                                          {10, 0, 10, 6, 10}, {1, 0.5, 10, 4, 0.5}, {3.3, 0, 10, 0, 3.3}};
   for (const auto &[value, low, high, step, result] : reals)
     EXPECT_EQ(Tools::clip(value, low, high, step), result) << value << " " << low << " " << high << " " << step;
   // The int form rounds up on the grid that starts at low, one step back above high.
-  const std::array<int, 5> integers[] = {{5, 1, 10, 4, 5},  {6, 1, 10, 4, 9},
-                                         {10, 1, 10, 4, 9}, {6, 1, 10, -2, 6},
-                                         {6, 1, 4, 4, 4},   {INT_MAX, INT_MIN, INT_MAX, INT_MAX, INT_MAX - 1}};
+  const std::array<int, 5> integers[] = {{5, 1, 10, 4, 5},
+                                         {6, 1, 10, 4, 9},
+                                         {10, 1, 10, 4, 9},
+                                         {0, 1, 10, 4, 1},
+                                         {6, 1, 10, -2, 6},
+                                         {6, 1, 4, 4, 4},
+                                         {INT_MAX, INT_MIN, INT_MAX, INT_MAX, INT_MAX - 1}};
   for (const auto &[value, low, high, step, result] : integers)
     EXPECT_EQ(Tools::clip(value, low, high, step), result) << value << " " << low << " " << high << " " << step;
-}
-
-TEST(ToolsTest, RoundTakesHalvesAwayFromZeroAndStepsBackAboveHigh) {
-  const std::array<double, 5> rows[] = {{9.9, 0, 10, 4, 8},   {10, 0, 10, 4, 8}, {2, 0, 10, 4, 4},
-                                        {-2, -10, 10, 4, -4}, {3.3, 0, 2, 5, 2}, {5, 10, 0, 0, 0}};
-  for (const auto &[value, low, high, step, result] : rows)
+  // round takes halves away from zero and steps back above high.
+  const std::array<double, 5> rounded[] = {
+      {10, 0, 10, 4, 8}, {2, 0, 10, 4, 4}, {-2, -10, 10, 4, -4}, {3.3, 0, 2, 5, 2}, {5, 10, 0, 0, 0}};
+  for (const auto &[value, low, high, step, result] : rounded)
     EXPECT_EQ(Tools::round(value, low, high, step), result) << value << " " << low << " " << high << " " << step;
 }
 
 TEST(ToolsTest, ToSingleAvoidsInfinitiesAndDenormals) {
   const std::pair<double, float> rows[] = {{1e39, 1e38F},  {-1e39, -1e38F}, {1e-38, 0.0F},
-                                           {-1e-38, 0.0F}, {1e-37, 1e-37F}, {1.5, 1.5F}};
+                                           {-1e-38, 0.0F}, {1e-37, 1e-37F}, {-1e-37, -1e-37F}};
   for (const auto &[value, single] : rows)
     EXPECT_EQ(Tools::toSingle(value), single) << value;
   EXPECT_TRUE(std::isnan(Tools::toSingle(std::numeric_limits<double>::quiet_NaN())));
