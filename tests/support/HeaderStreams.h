@@ -41,23 +41,19 @@ public:
 };
 
 /// Collects what is written in 1024-byte blocks, counting items as fwrite
-/// does; `closes` counts the finishing calls.
+/// does.
 class ItemWriter : public Buffer_DataWriter {
 public:
   ItemWriter() : Buffer_DataWriter(&store_) {}
   int write(const void *src, int size, int count) override {
     return Buffer_DataWriter::write(const_cast<void *>(src), size, count);
   }
-  bool close() override {
-    ++closes;
-    return true;
-  }
+  bool close() override { return true; }
   std::vector<unsigned char> bytes() {
     std::vector<unsigned char> out(static_cast<std::size_t>(store_.size()));
     store_.copyTo(out.data());
     return out;
   }
-  int closes = 0;
 
 private:
   DynamicBuffer store_{1024};

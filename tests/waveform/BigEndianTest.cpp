@@ -3,28 +3,12 @@
 
 #include <gtest/gtest.h>
 
-#include <algorithm>
 #include <climits>
-#include <cstring>
 #include <string>
 #include <vector>
 
 using namespace Corvane::Wavemill;
 using Bytes = std::vector<unsigned char>;
-
-namespace {
-
-// swapBytes gives the value with its bytes in reverse order.
-template <typename T> void expectSwapped(T value) {
-  const T swapped = swapBytes::doit(value);
-  unsigned char in[sizeof(T)], out[sizeof(T)];
-  std::memcpy(in, &value, sizeof(T));
-  std::memcpy(out, &swapped, sizeof(T));
-  std::reverse(out, out + sizeof(T));
-  EXPECT_EQ(std::memcmp(in, out, sizeof(T)), 0) << sizeof(T) << "-byte value";
-}
-
-} // namespace
 
 // The widths and their byte order: the waveform header tests hold every
 // type against tabled bytes and read each back.
@@ -32,37 +16,16 @@ TEST(BigEndianTest, MakeBlockStoresTheContentLengthInEightBits) {
   const auto mixed = BigEndian::makeBlock(7, static_cast<unsigned char>(1), static_cast<unsigned short>(0x0203),
                                           std::string("x\0y", 3));
   EXPECT_EQ(*mixed, (Bytes{7, 6, 0x01, 0x02, 0x03, 'x', 0x00, 'y'})); // a string has no length and no terminator
-  const struct {
-    std::size_t content;
-    unsigned char sizeByte;
-  } rows[] = {{0, 0}, {253, 253}, {255, 255}, {300, 44}};
-  for (const auto &row : rows) {
-    SCOPED_TRACE(row.content);
-    const auto block = BigEndian::makeBlock(7, std::string(row.content, 'a'));
-    ASSERT_EQ(block->size(), row.content + 2);
-    EXPECT_EQ((*block)[1], row.sizeByte);
-  }
+  const auto longBlock = BigEndian::makeBlock(7, std::string(300, 'a'));
+  ASSERT_EQ(longBlock->size(), 302u);
+  EXPECT_EQ((*longBlock)[1], 300 - 256);
 }
 
-TEST(BigEndianTest, ParseTakesOnlyTheFieldsThatFitAndLeavesTheRest) {
-  Bytes input(15);
-  input[0] = 0x3F, input[1] = 0xF0; // 1.0
-  double a = 5, b = 5, c = 5;
-  int pos = 0;
-  BigEndian::parse(gsl::make_span(input), &pos, &a, &b, &c);
-  EXPECT_EQ(a, 1.0);
-  EXPECT_EQ(b, 5.0);
-  EXPECT_EQ(c, 5.0);
-  EXPECT_EQ(pos, 8);
-
-  // A narrower field behind one that does not fit is still read.
-  unsigned short s = 0;
+TEST(BigEndianTest, ParseTakesTextFieldsOnlyWhereTheyFitAndRaisesOnHugeSpans) {
+  // Numbers that do not fit keep their value: the waveform header tests
+  // read short and cut blocks.
   unsigned char u = 0;
-  pos = 12;
-  BigEndian::parse(gsl::make_span(input), &pos, &a, &s, &u);
-  EXPECT_EQ(pos, 15);
-  EXPECT_EQ(a, 1.0);
-
+  int pos = 0;
   Bytes text{'a', 0, 'b', 'c', 'd'};
   const struct {
     const char *name;
@@ -84,6 +47,9 @@ TEST(BigEndianTest, ParseTakesOnlyTheFieldsThatFitAndLeavesTheRest) {
     EXPECT_EQ(value, row.after);
     EXPECT_EQ(pos, row.end);
   }
+  unsigned char one = 0;
+  const gsl::span<unsigned char> huge(&one, static_cast<std::size_t>(INT_MAX) + 1);
+  EXPECT_THROW(BigEndian::parse(huge, &pos, &u), gsl::narrowing_error);
 }
 
 TEST(BigEndianTest, ParseBlockSkipsWholeBlocksAndNeverReadsPastTheSpan) {
@@ -109,20 +75,10 @@ TEST(BigEndianTest, ParseBlockSkipsWholeBlocksAndNeverReadsPastTheSpan) {
     EXPECT_EQ(value, row.value);
     EXPECT_EQ(pos, row.end);
   }
-
-  unsigned char one = 0;
-  int pos = 0;
-  unsigned int value = 0;
-  const gsl::span<unsigned char> huge(&one, static_cast<std::size_t>(INT_MAX) + 1);
-  EXPECT_THROW(BigEndian::parse(huge, &pos, &value), gsl::narrowing_error);
 }
 
-TEST(SwapBytesTest, EveryOverloadReversesItsBytes) {
-  expectSwapped<short>(-2);
-  expectSwapped<unsigned short>(0x1234);
-  expectSwapped<int>(-123456789);
-  expectSwapped<unsigned int>(0x89ABCDEFu);
-  expectSwapped<float>(-1.0f);
-  expectSwapped<double>(9e99);
+// Every overload hands its bytes to the one reversing loop.
+TEST(SwapBytesTest, OverloadsReverseTheBytesOfTheirWidth) {
   EXPECT_EQ(swapBytes::doit(static_cast<unsigned short>(0x1234)), 0x3412);
+  EXPECT_EQ(swapBytes::doit(0x89ABCDEFu), 0xEFCDAB89u);
 }

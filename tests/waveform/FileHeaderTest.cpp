@@ -65,8 +65,7 @@ TEST(FileHeaderTest, NewHeadersSerializeTheirDefaultsByteForByteAndReadBack) {
     EXPECT_EQ(header->getCurrentHeaderSize(), static_cast<int>(row.expected.size()));
 
     ItemWriter unchanged;
-    EXPECT_TRUE(header->write(&unchanged)); // nothing changed: nothing written, not even closed
-    EXPECT_EQ(unchanged.closes, 0);
+    EXPECT_TRUE(header->write(&unchanged)); // nothing changed: nothing written
     EXPECT_TRUE(unchanged.bytes().empty());
 
     const auto back = row.make();
@@ -134,7 +133,6 @@ TEST(FileHeaderTest, ReadRefusesDamagedStreamsAndKeepsWhatOlderShorterBlocksLack
       {"no terminator", flexibleBase() + flexibleBlock1() + flexibleBlock3(), true},
       {"older, shorter block 1", flexibleBase() + olderBlock1 + end, true},
       {"block 3 twice", flexibleBase() + flexibleBlock1() + flexibleBlock3() + hex("03 05 0102030405") + end, false},
-      {"falling block ids", flexibleBase() + flexibleBlock3() + flexibleBlock1() + end, false},
       {"id 0 with a size", flexibleBase() + hex("00 05"), false},
       {"content cut short", flexibleBase() + shortBlock1, false},
       {"base block cut short", Bytes(15, 0), false},
@@ -177,13 +175,8 @@ TEST(HdrDescriptTest, DescriptorLayoutDropsTheLastTextCharacterAndBiasesTheResol
   hdrDescript built("ABCDEFGHIJKLMNOPQRSTUVWXYZ", DataRes4, -2.5);
   Bytes descriptor(32);
   built.getDescript(descriptor.data());
-  Bytes expected(32, 0);
-  for (int i = 0; i < 22; ++i) {
-    expected[static_cast<std::size_t>(i)] = static_cast<unsigned char>('A' + i);
-  }
-  expected[23] = 206;
-  expected[24] = 0xC0, expected[25] = 0x04;
-  EXPECT_EQ(descriptor, expected);
+  // "A" to "V", a zero, the resolution 4 + 202, and -2.5 as a big-endian double.
+  EXPECT_EQ(descriptor, hex("4142434445464748494A4B4C4D4E4F5051525354555600 CE C004000000000000"));
   char text[23];
   built.getText(text);
   EXPECT_EQ(std::string(text, 23), "ABCDEFGHIJKLMNOPQRSTUVW");
@@ -196,8 +189,7 @@ TEST(HdrDescriptTest, DescriptorLayoutDropsTheLastTextCharacterAndBiasesTheResol
   const struct {
     unsigned char stored;
     DataRes res;
-  } codes[] = {{201, DataResNone}, {202, DataResNone}, {203, DataRes1}, {204, DataRes2},
-               {205, DataResNone}, {206, DataRes4},    {0, DataResNone}};
+  } codes[] = {{202, DataResNone}, {203, DataRes1}, {204, DataRes2}, {205, DataResNone}, {206, DataRes4}};
   for (const auto &row : codes) {
     SCOPED_TRACE(static_cast<int>(row.stored));
     descriptor[23] = row.stored;

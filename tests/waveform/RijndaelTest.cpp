@@ -90,8 +90,9 @@ TEST(RijndaelTest, EveryModeMatchesOpenSslOnRandomKeysAndSizesOnEveryPath) {
               {24, EVP_aes_192_ecb(), EVP_aes_192_cbc(), EVP_aes_192_cfb1()},
               {32, EVP_aes_256_ecb(), EVP_aes_256_cbc(), EVP_aes_256_cfb1()}};
   for (const auto &k : keys) {
-    // Sizes around the widths of the wide loops run them and their tails.
-    for (std::size_t blocks : {1, 2, 7, 8, 9, 15, 16, 17, 19, 33, 255, 1001, 4095, 4096}) {
+    // One block, pairs, and either side of the 8-block AES-NI and 16-block
+    // VAES loops run the wide loops and their tails; 1001 runs them many times.
+    for (std::size_t blocks : {1, 2, 7, 8, 9, 15, 16, 17, 1001}) {
       SCOPED_TRACE(std::to_string(k.keyBytes) + "-byte key, blocks " + std::to_string(blocks));
       const Bytes key = randomBytes(random, k.keyBytes);
       const Bytes iv = randomBytes(random, 16);
@@ -109,7 +110,7 @@ TEST(RijndaelTest, EveryModeMatchesOpenSslOnRandomKeysAndSizesOnEveryPath) {
         EXPECT_EQ(ours(R::CBC, R::Encrypt, key, iv, message, true), padded);
         EXPECT_EQ(ours(R::CBC, R::Decrypt, key, iv, padded, true), message);
       });
-      if (blocks <= 17) { // a cipher call per bit: small sizes suffice
+      if (blocks <= 2) { // a cipher call per bit: the shift register crossing one block boundary suffices
         const Bytes cfb1 = openSsl(k.cfb1, key, iv, plain);
         EXPECT_EQ(ours(R::CFB1, R::Encrypt, key, iv, plain), cfb1);
         EXPECT_EQ(ours(R::CFB1, R::Decrypt, key, iv, cfb1), plain);
@@ -165,8 +166,8 @@ TEST(RijndaelTest, PadCountRulesDifferByMode) {
     unsigned char other; // the 15 bytes before it
     int expected;
   } rows[] = {
-      {R::ECB, 0, 7, 32},   {R::ECB, 15, 15, 17}, {R::ECB, 16, 16, -7}, {R::ECB, 3, 2, -7}, {R::CBC, 0, 7, -7},
-      {R::CBC, 16, 16, 16}, {R::CBC, 17, 17, -7}, {R::CBC, 1, 9, 31},   {R::CBC, 3, 2, -7},
+      {R::ECB, 0, 7, 32}, {R::ECB, 15, 15, 17}, {R::ECB, 16, 16, -7}, {R::ECB, 3, 2, -7},
+      {R::CBC, 0, 7, -7}, {R::CBC, 16, 16, 16}, {R::CBC, 17, 17, -7},
   };
   for (const auto &row : rows) {
     SCOPED_TRACE(std::to_string(row.mode) + " pad byte " + std::to_string(row.last));
@@ -185,25 +186,22 @@ TEST(RijndaelTest, PadCountRulesDifferByMode) {
 }
 
 TEST(EncryptorTest, ProcessRunsAes128EcbOnWholeBlocksUnderTheLatestKey) {
-  Bytes plain(48), cipher(48), back(48);
+  Bytes plain(48), cipher(48, 0xee), back(48);
   std::iota(plain.begin(), plain.end(), 3);
   Encryptor encryptor;
   Decryptor decryptor;
   EXPECT_EQ(encryptor.process(cipher.data(), plain.data(), 32), -5);
   EXPECT_EQ(decryptor.process(back.data(), cipher.data(), 32), -5);
   EXPECT_EQ(encryptor.init(nullptr), -4);
-  const unsigned char otherKey[16] = {1, 2, 3};
-  for (const unsigned char *key : {fixedFileKey, otherKey}) {
-    SCOPED_TRACE(key == fixedFileKey ? "file key" : "other key");
-    std::fill(cipher.begin(), cipher.end(), 0xee);
-    ASSERT_EQ(encryptor.init(key), 0);
-    ASSERT_EQ(decryptor.init(key), 0);
-    EXPECT_EQ(encryptor.process(cipher.data(), plain.data(), 31), 16);
-    EXPECT_EQ(cipher[16], 0xee); // the partial block is left alone
-    EXPECT_EQ(encryptor.process(cipher.data(), plain.data(), 15), 0);
-    EXPECT_EQ(encryptor.process(cipher.data(), plain.data(), 48), 48);
-    EXPECT_EQ(cipher, openSsl(EVP_aes_128_ecb(), Bytes(key, key + 16), {}, plain));
-    EXPECT_EQ(decryptor.process(back.data(), cipher.data(), 48), 48);
-    EXPECT_EQ(back, plain);
-  }
+  const unsigned char key[16] = {1, 2, 3};
+  ASSERT_EQ(encryptor.init(fixedFileKey), 0);
+  ASSERT_EQ(encryptor.init(key), 0);
+  ASSERT_EQ(decryptor.init(key), 0);
+  EXPECT_EQ(encryptor.process(cipher.data(), plain.data(), 31), 16);
+  EXPECT_EQ(cipher[16], 0xee); // the partial block is left alone
+  EXPECT_EQ(encryptor.process(cipher.data(), plain.data(), 15), 0);
+  EXPECT_EQ(encryptor.process(cipher.data(), plain.data(), 48), 48);
+  EXPECT_EQ(cipher, openSsl(EVP_aes_128_ecb(), Bytes(key, key + 16), {}, plain));
+  EXPECT_EQ(decryptor.process(back.data(), cipher.data(), 48), 48);
+  EXPECT_EQ(back, plain);
 }

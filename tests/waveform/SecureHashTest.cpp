@@ -42,7 +42,7 @@ std::string randomText(std::mt19937 &random, std::size_t length) {
 // length field, keys shorter and longer than a block.
 TEST(SecureHashTest, DigestsAndMacsMatchOpenSslWholeAndFedInPieces) {
   std::mt19937 random(99);
-  for (std::size_t length : {0, 1, 3, 32, 55, 56, 63, 64, 65, 119, 120, 128, 1000, 4099, 1000000}) {
+  for (std::size_t length : {0, 3, 55, 56, 63, 64, 65, 119, 120, 4099}) {
     SCOPED_TRACE("length " + std::to_string(length));
     const std::string message = randomText(random, length);
     const auto *data = reinterpret_cast<const unsigned char *>(message.data());
@@ -66,7 +66,7 @@ TEST(SecureHashTest, DigestsAndMacsMatchOpenSslWholeAndFedInPieces) {
     EXPECT_EQ(hi, wordAt(expected));
     EXPECT_EQ(lo, wordAt(expected + 4));
 
-    for (std::size_t keyLength : {0, 1, 20, 41, 63, 64, 65, 130}) {
+    for (std::size_t keyLength : {0, 20, 64, 65}) {
       SCOPED_TRACE("key " + std::to_string(keyLength));
       const std::string key = randomText(random, keyLength);
       HMAC(EVP_sha1(), key.data(), static_cast<int>(keyLength), data, length, expected, nullptr);
