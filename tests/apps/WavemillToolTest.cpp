@@ -180,8 +180,6 @@ TEST(WavemillToolTest, CommandsPrintTheirAnswerOrOneLineOfFailureAndLeaveNoOutpu
     SimulatedInstrument gone; // a port that was free a moment ago and now refuses
     closed = gone.getAddress();
   }
-  const std::string visa = "CORVISA_INSTR_PORT=" + std::to_string(simulator.getPort()) +
-                           " WAVEMILL_VISA_LIBRARY=" + WAVEMILL_CORVISA_LIBRARY + " ";
   const std::string corvisa = std::string("WAVEMILL_VISA_LIBRARY=") + WAVEMILL_CORVISA_LIBRARY +
                               " CORVISA_RESOURCES='TCPIP0::127.0.0.1::inst0::INSTR;ASRL1::INSTR' ";
   const std::string noFile = ": No such file or directory\n";
@@ -193,7 +191,6 @@ TEST(WavemillToolTest, CommandsPrintTheirAnswerOrOneLineOfFailureAndLeaveNoOutpu
   };
   const Row rows[] = {
       {"wavemill scpi " + address + " '*IDN?' 'FREQ 2e9' 'FREQ?'", 0, "Corvane,SG200,100123,1.4.2\n2e9\n", ""},
-      {visa + "wavemill scpi TCPIP0::127.0.0.1::inst0::INSTR 'POW -20' 'POW?'", 0, "-20\n", ""},
       {"wavemill identify " + address, 0,
        "address       " + address +
            "\nidentity      Corvane,SG200,100123,1.4.2\nmanufacturer  Corvane\nmodel         SG200\n"
