@@ -12,8 +12,10 @@
 #include <filesystem>
 #include <functional>
 #include <iterator>
+#include <optional>
 #include <string>
 #include <utility>
+#include <vector>
 
 using namespace Corvane::Wavemill;
 using namespace Corvane::Wavemill::ExportImport;
@@ -67,8 +69,6 @@ TEST(WaveformPackageTest, BeforeBeginEveryWriteIsRefusedAndNoFileAppears) {
       {"append", [&](WaveformPackage &p) { return p.append(chunk); }},
       {"appendMarker", [&](WaveformPackage &p) { return p.appendMarker(chunk); }},
       {"beginFloat", [](WaveformPackage &p) { return p.beginFloat(16, true); }},
-      {"appendFloat", [&](WaveformPackage &p) { return p.appendFloat(chunk); }},
-      {"appendFloatMarker", [&](WaveformPackage &p) { return p.appendFloatMarker(chunk); }},
       {"begin without a name",
        [&](WaveformPackage &p) {
          p.setFileName("");
@@ -106,4 +106,35 @@ TEST(WaveformPackageTest, SecondBeginWritesANewFileAndUnwritableTargetsLeaveNone
   EXPECT_TRUE(package.begin(100, true));
   writeChunks(package, iq, markers, 30);
   EXPECT_EQ(std::distance(std::filesystem::directory_iterator(dir.root()), {}), 3); // no "folder_mkr"
+}
+
+TEST(WaveformImporterTest, MissingEmptyCutOrDamagedFilesAnswerEmptyAndNeverReadOutsideTheirBytes) {
+  TempDir dir;
+  const Bytes markers = patternBytes(100, 2);
+  const Bytes good = encryptWaveform(plainWaveform(WaveformHeader().getHeaderBytes(), patternBytes(400, 1), &markers));
+  std::vector<std::pair<std::string, std::optional<Bytes>>> rows{{"missing", std::nullopt}, {"empty", Bytes{}}};
+  for (std::size_t cut : {20u, 40u, 64u}) {
+    rows.emplace_back("cut at " + std::to_string(cut), Bytes(good.begin(), good.begin() + cut));
+  }
+  for (std::size_t at = 0; at < 320; ++at) { // the head, the header package and the IQ prefix
+    rows.emplace_back("byte " + std::to_string(at) + " flipped", good);
+    (*rows.back().second)[at] ^= 0x5a;
+  }
+  for (const auto &[name, bytes] : rows) {
+    SCOPED_TRACE(name);
+    const std::string file = dir.path(name + ".wv");
+    if (bytes) {
+      writeBytes(file, *bytes);
+    }
+    WaveformImporter importer(file);
+    const auto header = importer.getHeaderBytes();
+    EXPECT_TRUE(bytes && bytes->size() > 64 ? header.size() <= 1024 : header.empty()); // cut inside the header
+    EXPECT_EQ(importer.getWaveformHeader() == nullptr, header.empty());
+    if (header.empty()) {
+      EXPECT_EQ(importer.getDataLength(), -1); // a file without a header stays closed
+    }
+    Bytes buffer(100);
+    EXPECT_EQ(importer.getData(buffer), -1);
+    EXPECT_LE(importer.getMarker(buffer), 0);
+  }
 }
