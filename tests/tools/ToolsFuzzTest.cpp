@@ -57,10 +57,7 @@ std::string mutate(std::mt19937 &random, std::string text) {
 
 /// Half random bytes, half mutations of one of the `seeds`.
 std::string fuzzInput(std::mt19937 &random, const std::vector<std::string> &seeds) {
-  if (random() % 2 == 0) {
-    return randomBytes(random, 64);
-  }
-  return mutate(random, seeds[random() % seeds.size()]);
+  return random() % 2 == 0 ? randomBytes(random, 64) : mutate(random, seeds[random() % seeds.size()]);
 }
 
 } // namespace

@@ -128,7 +128,6 @@ TEST(ToolsTest, ThreadIdIsStableWithinAThreadAndDiffersBetweenThreadsAndTheHostN
 
   std::string expected;
   std::getline(std::ifstream("/proc/sys/kernel/hostname"), expected);
-  EXPECT_FALSE(Tools::getHostname().empty());
   EXPECT_EQ(Tools::getHostname(), expected);
 }
 

@@ -4,7 +4,13 @@
 
 #include <gtest/gtest.h>
 
+#include <array>
+#include <climits>
+#include <clocale>
+#include <cmath>
 #include <cstdint>
+#include <cstdlib>
+#include <limits>
 #include <string>
 #include <utility>
 #include <vector>
@@ -12,12 +18,8 @@
 using namespace Corvane::Wavemill;
 using Corvane::Wavemill::Testing::thrown;
 
-namespace {
-
 using Pieces = std::vector<std::string>;
 using Text = std::pair<std::string, std::string>;
-
-} // namespace
 
 TEST(ToolsTest, SplitKeepsLeadingAndInnerEmptyPiecesTrimOnlyTheEndsAndReplaceNeverRescans) {
   const std::pair<const char *, Pieces> splits[] = {
@@ -82,4 +84,93 @@ TEST(ToolsTest, EnumerationItemsGoByClampedIndexFirstWordAndWholeItemOrListTail)
                                                   {"lph", -1},   {"phabet", -1},  {"", -1}};
   for (const auto &[text, index] : indexes)
     EXPECT_EQ(Tools::textToEnumIndex("Alphabet, Alpha, Beta", text), index) << text;
+}
+
+TEST(ToolsTest, ParseFunctionsTakeTheLeadingNumberOrAnswerTheDefaultOrLeaveTheValueAlone) {
+  EXPECT_EQ(Tools::parseInt32("12345678901", 7), 7);
+  EXPECT_EQ(Tools::parseInt32(" 42abc", 7), 42);
+  EXPECT_EQ(Tools::parseInt64("9000000000", 0), 9000000000);
+  EXPECT_EQ(Tools::parseFloat("0.25", 0), 0.25F);
+  EXPECT_EQ(Tools::parseFloat("1e39", 3), 3.0F);
+
+  // tryParse leaves the value alone when it fails.
+  int value = 0;
+  EXPECT_TRUE(Tools::tryParse("ff", value, 16));
+  EXPECT_EQ(value, 255);
+  EXPECT_TRUE(Tools::tryParse(" -7x", value, 10));
+  EXPECT_EQ(value, -7);
+  using Row = std::pair<const char *, int>;
+  for (const auto &[text, base] : {Row{"zz", 10}, Row{"99999999999", 10}, Row{"12", 1}, Row{"12", 37}})
+    EXPECT_FALSE(Tools::tryParse(text, value, base)) << text << " in base " << base;
+  EXPECT_EQ(value, -7);
+}
+
+TEST(ToolsTest, TryParseDoubleRefusesWhatTheFilterRejectsAndPassesConversionFailuresOn) {
+  double value = -1;
+  for (const char *text : {"", "1e5e3", "e5", "1..2", "+-1", "1-2", ".-1", "1,5", "1e+-3", "1e3-"})
+    EXPECT_FALSE(Tools::tryParse(text, value)) << text;
+  EXPECT_EQ(value, -1);
+  const std::pair<const char *, double> accepted[] = {{"5e", 5}, {"1 2", 1}, {" -1.5E-3", -1.5e-3}};
+  for (const auto &[text, number] : accepted) {
+    EXPECT_TRUE(Tools::tryParse(text, value)) << text;
+    EXPECT_EQ(value, number) << text;
+  }
+  EXPECT_EQ(thrown([&] { Tools::tryParse("- 1", value); }), "invalid_argument: invalid stod argument");
+  EXPECT_EQ(thrown([&] { Tools::tryParse("1e999", value); }), "out_of_range: stod argument out of range");
+}
+
+// Each row: value, low, high, step and the result.
+TEST(ToolsTest, ClipAndRoundFormsDifferInGridOriginDirectionAndHalves) {
+  // The double form takes the nearest multiple of the step counted from zero,
+  // within the limits that the float form applies alone.
+  const std::array<double, 5> reals[] = {{7, 0, 10, 4, 8},   {-1, 0, 10, 4, 0},    {11, 0, 10, 4, 10},
+                                         {10, 0, 10, 6, 10}, {1, 0.5, 10, 4, 0.5}, {3.3, 0, 10, 0, 3.3}};
+  for (const auto &[value, low, high, step, result] : reals)
+    EXPECT_EQ(Tools::clip(value, low, high, step), result) << value << " " << low << " " << high << " " << step;
+  // The int form rounds up on the grid that starts at low, one step back above high.
+  const std::array<int, 5> integers[] = {{5, 1, 10, 4, 5},
+                                         {6, 1, 10, 4, 9},
+                                         {10, 1, 10, 4, 9},
+                                         {0, 1, 10, 4, 1},
+                                         {6, 1, 10, -2, 6},
+                                         {6, 1, 4, 4, 4},
+                                         {INT_MAX, INT_MIN, INT_MAX, INT_MAX, INT_MAX - 1}};
+  for (const auto &[value, low, high, step, result] : integers)
+    EXPECT_EQ(Tools::clip(value, low, high, step), result) << value << " " << low << " " << high << " " << step;
+  // round takes halves away from zero and steps back above high.
+  const std::array<double, 5> rounded[] = {
+      {10, 0, 10, 4, 8}, {2, 0, 10, 4, 4}, {-2, -10, 10, 4, -4}, {3.3, 0, 2, 5, 2}, {5, 10, 0, 0, 0}};
+  for (const auto &[value, low, high, step, result] : rounded)
+    EXPECT_EQ(Tools::round(value, low, high, step), result) << value << " " << low << " " << high << " " << step;
+}
+
+TEST(ToolsTest, ToSingleAvoidsInfinitiesAndDenormals) {
+  const std::pair<double, float> rows[] = {{1e39, 1e38F},  {-1e39, -1e38F}, {1e-38, 0.0F},
+                                           {-1e-38, 0.0F}, {1e-37, 1e-37F}, {-1e-37, -1e-37F}};
+  for (const auto &[value, single] : rows)
+    EXPECT_EQ(Tools::toSingle(value), single) << value;
+  EXPECT_TRUE(std::isnan(Tools::toSingle(std::numeric_limits<double>::quiet_NaN())));
+}
+
+// The conversions take the user's locale from the environment; where that is
+// the plain "C" locale, the library's own UTF-8 coding stands in for it.
+TEST(ToolsTest, WideTextRoundTripsAsUtf8AndStopsAtTheFirstZero) {
+  const char *before = std::getenv("LC_ALL");
+  const std::string savedVariable = before == nullptr ? "" : before;
+  const std::string savedLocale = std::setlocale(LC_CTYPE, nullptr);
+  const std::string narrow = "Gr\xc3\xbc\xc3\x9f"
+                             "e";
+  for (const char *user : {"C", "C.UTF-8"}) {
+    SCOPED_TRACE(user);
+    ::setenv("LC_ALL", user, 1);
+    EXPECT_EQ(Tools::toWString(narrow), L"Gr\u00fc\u00dfe");
+    EXPECT_EQ(Tools::toString(L"Gr\u00fc\u00dfe"), narrow);
+    EXPECT_EQ(Tools::toWString("ab\0cd", 5), L"ab");
+    EXPECT_EQ(Tools::toString(std::wstring(L"ab\0cd", 5)), "ab");
+    EXPECT_EQ(Tools::toWString(nullptr, 3), L"");
+    EXPECT_EQ(Tools::toString(L"xyz", 2), "xy");
+    EXPECT_EQ(Tools::toWString("ok\xff"), L"");
+  }
+  before == nullptr ? ::unsetenv("LC_ALL") : ::setenv("LC_ALL", savedVariable.c_str(), 1);
+  std::setlocale(LC_CTYPE, savedLocale.c_str());
 }

@@ -5,6 +5,7 @@
 
 #include <gtest/gtest.h>
 
+#include <array>
 #include <cfenv>
 #include <cmath>
 #include <complex>
@@ -87,20 +88,18 @@ TEST(ToolsTest, ConvertToWaveformRoundsInTheCurrentModeAndClampsToSixteenBits) {
                                                      -32768, 16384}));
 
   // To nearest, halves go to even, not away from zero.
-  const struct {
-    int mode;
-    std::int16_t i, q;
-  } modes[] = {{FE_TONEAREST, 2, -4}, {FE_UPWARD, 3, -3}, {FE_DOWNWARD, 2, -4}, {FE_TOWARDZERO, 2, -3}};
-  for (const auto &row : modes) {
-    SCOPED_TRACE(row.mode);
+  const std::array<int, 3> modes[] = {
+      {FE_TONEAREST, 2, -4}, {FE_UPWARD, 3, -3}, {FE_DOWNWARD, 2, -4}, {FE_TOWARDZERO, 2, -3}};
+  for (const auto &[mode, i, q] : modes) {
+    SCOPED_TRACE(mode);
     Bytes out(4 * 6);
     const int previous = std::fegetround();
-    std::fesetround(row.mode);
+    std::fesetround(mode);
     Tools::convertToWaveform(Samples(6, {2.5, -3.5}), out, 1.0 / 32767);
     std::fesetround(previous);
     std::vector<std::int16_t> expected;
     for (int n = 0; n < 6; ++n)
-      expected.insert(expected.end(), {row.i, row.q});
+      expected.insert(expected.end(), {static_cast<std::int16_t>(i), static_cast<std::int16_t>(q)});
     EXPECT_EQ(words(out), expected);
   }
 
