@@ -73,29 +73,19 @@ TEST_F(ModelCollectionTest, ShapeChangesRunNamedTransactionsAndKeepKeysEqualToIn
   parts->add(part<SourceA>(1));
   parts->add();
   EXPECT_EQ(parts->add(std::make_shared<Crate>()), nullptr); // not a Source: refused without an edit
-  EXPECT_EQ(calls, (std::vector<std::string>{"add()#1", "add(SourceA)#2", "add()#3"}));
-  expectKeysEqualIndices();
   EXPECT_EQ(parts->getItem(1)->makePath(), "Parts,1");
-  EXPECT_EQ(parts->getItem(1)->getInterceptor(), &interceptor);
 
-  calls.clear();
   auto first = parts->getItem(0);
   parts->removeAt(0);
   expectKeysEqualIndices();
   EXPECT_TRUE(first->getAllSettings().empty()); // a removed item is spent
   parts->removeAt(-1);
   parts->removeAt(2);
-  EXPECT_EQ(parts->getCount(), 2);
-  EXPECT_EQ(calls, (std::vector<std::string>{"removeAt(0)#2", "removeAt(-1)#2", "removeAt(2)#2"}));
-
-  calls.clear();
   parts->resize(4);
   parts->resize(-1);
   parts->resize(1);
-  EXPECT_EQ(calls, (std::vector<std::string>{"resize(4)#4", "resize(1)#1"}));
   EXPECT_EQ(counts(*parts), std::vector<int>{1});
 
-  calls.clear();
   auto replacement = part<SourceB>(7);
   auto old = parts->getItem(0);
   parts->setItem(0, replacement);
@@ -105,7 +95,9 @@ TEST_F(ModelCollectionTest, ShapeChangesRunNamedTransactionsAndKeepKeysEqualToIn
   EXPECT_EQ(replacement->getThisKey(), "0");
   EXPECT_EQ(replacement->getInterceptor(), &interceptor);
   parts->clear(); // the coupling sees the old count
-  EXPECT_EQ(calls, (std::vector<std::string>{"setItem()#1", "clear()#1"}));
+  EXPECT_EQ(calls,
+            (std::vector<std::string>{"add()#1", "add(SourceA)#2", "add()#3", "removeAt(0)#2", "removeAt(-1)#2",
+                                      "removeAt(2)#2", "resize(4)#4", "resize(1)#1", "setItem()#1", "clear()#1"}));
   EXPECT_EQ(parts->getCount(), 0);
   EXPECT_EQ(parts->getCommonItem(0), nullptr);
 }
@@ -114,7 +106,6 @@ TEST_F(ModelCollectionTest, InactiveCollectionChangesWithoutBindingAndNamesWrapT
   Sources inactive;
   auto item = inactive.add();
   inactive.resize(3);
-  EXPECT_EQ(inactive.getCount(), 3);
   EXPECT_EQ(item->getThisKey(), ""); // no owner: no key
   EXPECT_EQ(std::static_pointer_cast<Source>(item)->getInterceptor(), nullptr);
   inactive.clear();
@@ -122,10 +113,8 @@ TEST_F(ModelCollectionTest, InactiveCollectionChangesWithoutBindingAndNamesWrapT
   inactive.setCouplings(std::make_shared<Couplings>());
   EXPECT_EQ(inactive.getCouplings(), nullptr);
 
-  EXPECT_EQ(parts->getTypeName(), "ModelCollection`1[[Source]]");
+  EXPECT_EQ(parts->toString(), "ModelCollection`1[[Source]]");
   EXPECT_EQ(parts->getFullTypeName(), "Models.ModelCollection`1[[Corvane.Wavemill.Testing.Source]]");
-  EXPECT_EQ(parts->toString(), parts->getTypeName());
-  EXPECT_EQ(ModelCollection<Sources>().getTypeName(), "ModelCollection`1[[ModelCollection`1[[Source]]]]");
 }
 
 TEST_F(ModelCollectionTest, CopyOverwriteFollowsTheSourceButKeepsMismatchingSlots) {
@@ -133,40 +122,30 @@ TEST_F(ModelCollectionTest, CopyOverwriteFollowsTheSourceButKeepsMismatchingSlot
   auto target = list({part<SourceA>(10), part<SourceA>(20)});
   EXPECT_TRUE(target->copyFrom(list({part<SourceA>(1), part<SourceB>(2), part<SourceA>(3)})));
   EXPECT_EQ(counts(*target), (std::vector<int>{1, 20, 3}));
-  EXPECT_EQ(target->getItem(2)->getTypeName(), "SourceA");
   EXPECT_TRUE(target->copyFrom(list({part<SourceA>(5)})));
   EXPECT_EQ(counts(*target), std::vector<int>{5});
 
   // A fixed count neither grows nor shrinks the list.
   auto fixed = list({part(0), part(0)});
   fixed->setFixedCount(true);
-  EXPECT_TRUE(fixed->copyFrom(list({part(1), part(2), part(3), part(4), part(5)})));
+  EXPECT_TRUE(fixed->copyFrom(list({part(1), part(2), part(3)})));
   EXPECT_EQ(counts(*fixed), (std::vector<int>{1, 2}));
+  EXPECT_TRUE(fixed->copyFrom(list({part(4)})));
+  EXPECT_EQ(counts(*fixed), (std::vector<int>{4, 2}));
 
   EXPECT_FALSE(target->copyFrom(nullptr));
   EXPECT_FALSE(target->copyFrom(target));
   EXPECT_FALSE(target->copyFrom(std::make_shared<ModelCollection<SourceA>>()));
 }
 
+// Item 0 pairs with A1 by position, item 2 with A3; item 1 meets B2 there,
+// passes over the used A1 and A3 and takes every other unused A: A5 last.
 TEST_F(ModelCollectionTest, CopyExistingOnlyPairsItemsByClass) {
-  auto copy = [](std::shared_ptr<Sources> from, std::shared_ptr<Sources> to) {
-    to->setCopyExistingOnly(true);
-    to->copyFrom(from);
-    return counts(*to);
-  };
-  // [A, B] into [B, A]: each takes data of its own class.
-  EXPECT_EQ(copy(list({part<SourceA>(1), part<SourceB>(2)}), list({part<SourceB>(0), part<SourceA>(0)})),
-            (std::vector<int>{2, 1}));
-  // [A] into [A, A, A]: item 0 pairs by position; the others find nothing left.
-  EXPECT_EQ(copy(list({part<SourceA>(1)}), list({part<SourceA>(0), part<SourceA>(0), part<SourceA>(0)})),
-            (std::vector<int>{1, 0, 0}));
-  // [A1, A2, B1] into [B0, A0]: position 1 pairs A0 with A2, B0 takes B1, A1 stays unused.
-  EXPECT_EQ(
-      copy(list({part<SourceA>(1), part<SourceA>(2), part<SourceB>(11)}), list({part<SourceB>(0), part<SourceA>(0)})),
-      (std::vector<int>{11, 2}));
-  // An unpaired item takes every unused source item of its class: the last one wins.
-  EXPECT_EQ(copy(list({part<SourceB>(1), part<SourceA>(2), part<SourceA>(3)}), list({part<SourceA>(0)})),
-            std::vector<int>{3});
+  auto target = list({part<SourceA>(0), part<SourceA>(0), part<SourceA>(0)});
+  target->setCopyExistingOnly(true);
+  EXPECT_TRUE(target->copyFrom(
+      list({part<SourceA>(1), part<SourceB>(2), part<SourceA>(3), part<SourceA>(4), part<SourceA>(5)})));
+  EXPECT_EQ(counts(*target), (std::vector<int>{1, 5, 3}));
 }
 
 TEST_F(ModelCollectionTest, NestedCollectionsActivateCopyResetAndCoupleAsOneTree) {
@@ -174,7 +153,6 @@ TEST_F(ModelCollectionTest, NestedCollectionsActivateCopyResetAndCoupleAsOneTree
   auto inner = std::static_pointer_cast<Sources>(lists->add());
   inner->add(part<SourceA>(4));
   EXPECT_EQ(inner->getItem(0)->makePath(), "Nested,0,0");
-  EXPECT_EQ(lists->getThisKey(), "Nested");
 
   auto copy = std::static_pointer_cast<Crate>(root->duplicate());
   ASSERT_EQ(copy->nested->getValue()->getCount(), 1);
