@@ -41,24 +41,16 @@ struct RunTimeProbeInner {
 
 } // namespace Corvane::Wavemill
 
+// The class keyword in front of a template argument is dropped; the
+// templates without one are named by the macros below.
 TEST(RunTimeTest, MicrosoftSignaturesGiveFullAndShortNames) {
-  const std::string result =
-      "class std::basic_string<char,struct std::char_traits<char>,class std::allocator<char> > __cdecl ";
-  // Member text behind the result type, full name, short name.
-  const std::string cases[][3] = {
-      {"Corvane::Wavemill::ModelCollection<class Corvane::Wavemill::TextPair>::getFullTypeName(void) const",
-       "Corvane::Wavemill::ModelCollection`1[[Corvane::Wavemill::TextPair]]", "ModelCollection`1[[TextPair]]"},
-      {"Corvane::Wavemill::Box<int>::getFullTypeName(void) const", "Corvane::Wavemill::Box`1[[int]]", "Box`1[[int]]"},
-      // The nearest "<" is the inner one, so the outer class is not recognised.
-      {"ModelCollection<class ModelCollection<class Foo> >::getFullTypeName(void) const", ">",
-       "ModelCollection`1[[Foo> ]]"},
-  };
-  for (const auto &[member, full, brief] : cases) {
-    const auto signature = result + member;
-    const int size = static_cast<int>(signature.size()) + 1;
-    EXPECT_EQ(RunTime::doGetFullTypeName(signature.c_str(), size), full) << member;
-    EXPECT_EQ(RunTime::doGetTypeName(signature.c_str(), size), brief) << member;
-  }
+  const std::string signature =
+      "class std::basic_string<char,struct std::char_traits<char>,class std::allocator<char> > __cdecl "
+      "Corvane::Wavemill::ModelCollection<class Corvane::Wavemill::TextPair>::getFullTypeName(void) const";
+  const int size = static_cast<int>(signature.size()) + 1;
+  EXPECT_EQ(RunTime::doGetFullTypeName(signature.c_str(), size),
+            "Corvane::Wavemill::ModelCollection`1[[Corvane::Wavemill::TextPair]]");
+  EXPECT_EQ(RunTime::doGetTypeName(signature.c_str(), size), "ModelCollection`1[[TextPair]]");
 }
 
 TEST(RunTimeTest, TextWithoutClassGivesEmptyNames) {
