@@ -40,3 +40,16 @@ TEST(DynamicBufferTest, PiecesNeverStraddleABlockAndCopyToSkipsTheGaps) {
   EXPECT_EQ(buffer.append(source.data(), 4), 4);
   EXPECT_EQ(buffer.copyTo(out.data()), 4);
 }
+
+TEST(DynamicBufferTest, ALongChainIsFreedWithoutRecursion) {
+  // A million one-byte blocks: freeing them by recursion would overflow
+  // the stack, more so under the sanitizers.
+  DynamicBuffer buffer(1);
+  unsigned char byte = 7;
+  for (int i = 0; i < 1000000; ++i) {
+    ASSERT_EQ(buffer.append(&byte, 1), 1);
+  }
+  EXPECT_EQ(buffer.size(), 1000000);
+  buffer.reset();
+  EXPECT_EQ(buffer.size(), 0);
+}

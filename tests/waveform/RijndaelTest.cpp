@@ -2,6 +2,8 @@
 #include "wavemill/waveform/EncryptKey.h"
 #include "wavemill/waveform/Encryptor.h"
 
+#include "support/WaveformFiles.h"
+
 #include <gtest/gtest.h>
 #include <openssl/evp.h>
 
@@ -16,16 +18,8 @@ using namespace Corvane::Wavemill;
 
 namespace {
 
-using Bytes = std::vector<unsigned char>;
+using Corvane::Wavemill::Testing::Bytes;
 using R = Rijndael;
-
-Bytes randomBytes(std::mt19937 &random, std::size_t count) {
-  Bytes bytes(count);
-  for (auto &byte : bytes) {
-    byte = static_cast<unsigned char>(random());
-  }
-  return bytes;
-}
 
 // Runs `check` once per code path this processor has, and restores the
 // default afterwards even when an assertion fails.
@@ -94,9 +88,9 @@ TEST(RijndaelTest, EveryModeMatchesOpenSslOnRandomKeysAndSizesOnEveryPath) {
     // VAES loops run the wide loops and their tails; 1001 runs them many times.
     for (std::size_t blocks : {1, 2, 7, 8, 9, 15, 16, 17, 1001}) {
       SCOPED_TRACE(std::to_string(k.keyBytes) + "-byte key, blocks " + std::to_string(blocks));
-      const Bytes key = randomBytes(random, k.keyBytes);
-      const Bytes iv = randomBytes(random, 16);
-      const Bytes plain = randomBytes(random, 16 * blocks);
+      const Bytes key = Testing::patternBytes(k.keyBytes, random());
+      const Bytes iv = Testing::patternBytes(16, random());
+      const Bytes plain = Testing::patternBytes(16 * blocks, random());
       const Bytes ecb = openSsl(k.ecb, key, {}, plain);
       const Bytes cbc = openSsl(k.cbc, key, iv, plain);
       // The padded form cuts a random tail so that every pad count occurs.

@@ -1,6 +1,8 @@
 #include "wavemill/waveform/SecureHash.h"
 #include "wavemill/waveform/EncryptKey.h"
 
+#include "support/WaveformFiles.h"
+
 #include <gtest/gtest.h>
 #include <openssl/evp.h>
 #include <openssl/hmac.h>
@@ -28,14 +30,6 @@ unsigned int wordAt(const unsigned char *p) {
          static_cast<unsigned int>(p[2]) << 8 | p[3];
 }
 
-std::string randomText(std::mt19937 &random, std::size_t length) {
-  std::string text(length, '\0');
-  for (auto &c : text) {
-    c = static_cast<char>(random());
-  }
-  return text;
-}
-
 } // namespace
 
 // OpenSSL is the reference: lengths around the 64-byte block and its 56-byte
@@ -44,8 +38,8 @@ TEST(SecureHashTest, DigestsAndMacsMatchOpenSslWholeAndFedInPieces) {
   std::mt19937 random(99);
   for (std::size_t length : {0, 3, 55, 56, 63, 64, 65, 119, 120, 4099}) {
     SCOPED_TRACE("length " + std::to_string(length));
-    const std::string message = randomText(random, length);
-    const auto *data = reinterpret_cast<const unsigned char *>(message.data());
+    const Testing::Bytes message = Testing::patternBytes(length, random());
+    const unsigned char *data = message.data();
     const auto n = static_cast<unsigned int>(length);
     unsigned char expected[EVP_MAX_MD_SIZE], ours[20];
     EVP_Digest(data, length, expected, nullptr, EVP_sha1(), nullptr);
@@ -68,10 +62,10 @@ TEST(SecureHashTest, DigestsAndMacsMatchOpenSslWholeAndFedInPieces) {
 
     for (std::size_t keyLength : {0, 20, 64, 65}) {
       SCOPED_TRACE("key " + std::to_string(keyLength));
-      const std::string key = randomText(random, keyLength);
+      // A byte more than the key, so that OpenSSL gets an address for an empty key.
+      const Testing::Bytes key = Testing::patternBytes(keyLength + 1, random());
       HMAC(EVP_sha1(), key.data(), static_cast<int>(keyLength), data, length, expected, nullptr);
-      SecureHash::HMACSHA1(data, n, reinterpret_cast<const unsigned char *>(key.data()),
-                           static_cast<unsigned int>(keyLength), ours);
+      SecureHash::HMACSHA1(data, n, key.data(), static_cast<unsigned int>(keyLength), ours);
       EXPECT_EQ(hexOf(ours), hexOf(expected));
     }
     // The fixed key is the 40 characters and their terminating zero.
