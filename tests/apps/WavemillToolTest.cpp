@@ -113,7 +113,7 @@ TEST(WavemillToolTest, PackInfoUnpackRoundTripThroughCsvRawSamplesAndMarkerFiles
   const Samples samples = makeSamples(5003);
   TempDir dir;
   writeAll(dir.path("in.csv"), csv(samples));
-  const Result pack = run(dir, "wavemill wv pack in.csv out.wv --set tag5=demo");
+  const Result pack = run(dir, "wavemill wv pack in.csv out.wv");
   ASSERT_EQ(pack.code, 0) << pack.err;
   EXPECT_EQ(pack.err, ""); // no progress bar: standard error is a file
 
@@ -122,9 +122,6 @@ TEST(WavemillToolTest, PackInfoUnpackRoundTripThroughCsvRawSamplesAndMarkerFiles
   EXPECT_NE(info.out.find("samples        5003\n"), std::string::npos) << info.out;
   EXPECT_NE(info.out.find("format         integer\n"), std::string::npos);
   EXPECT_NE(info.out.find("markers        present\n"), std::string::npos);
-  const Result json = run(dir, "wavemill wv info --json out.wv");
-  EXPECT_NE(json.out.find("\"samples\": 5003,"), std::string::npos) << json.out;
-  EXPECT_NE(json.out.find("\"tag5\": \"demo  "), std::string::npos);
 
   const Result unpack = run(dir, "wavemill wv unpack out.wv -");
   ASSERT_EQ(unpack.code, 0) << unpack.err;
@@ -182,7 +179,6 @@ TEST(WavemillToolTest, CommandsPrintTheirAnswerOrOneLineOfFailureAndLeaveNoOutpu
   }
   const std::string corvisa = std::string("WAVEMILL_VISA_LIBRARY=") + WAVEMILL_CORVISA_LIBRARY +
                               " CORVISA_RESOURCES='TCPIP0::127.0.0.1::inst0::INSTR;ASRL1::INSTR' ";
-  const std::string noFile = ": No such file or directory\n";
   struct Row {
     std::string commandLine;
     int code;
@@ -196,12 +192,6 @@ TEST(WavemillToolTest, CommandsPrintTheirAnswerOrOneLineOfFailureAndLeaveNoOutpu
            "\nidentity      Corvane,SG200,100123,1.4.2\nmanufacturer  Corvane\nmodel         SG200\n"
            "serial        100123\nfirmware      1.4.2\noptions       B10,B22,K20,K24\n",
        ""},
-      {"wavemill identify --json " + address, 0,
-       "{\n  \"address\": \"" + address +
-           "\",\n  \"identity\": \"Corvane,SG200,100123,1.4.2\",\n  \"manufacturer\": \"Corvane\",\n"
-           "  \"model\": \"SG200\",\n  \"serial\": \"100123\",\n  \"firmware\": \"1.4.2\",\n"
-           "  \"options\": \"B10,B22,K20,K24\"\n}\n",
-       ""},
       {"wavemill scpi " + address + " --block up.bin \"MMEM:DATA 'w'\" --read-block down.bin \"MMEM:DATA? 'w'\"", 0, "",
        ""},
       {corvisa + "wavemill find", 0, "TCPIP0::127.0.0.1::inst0::INSTR\nASRL1::INSTR\n", ""},
@@ -212,21 +202,15 @@ TEST(WavemillToolTest, CommandsPrintTheirAnswerOrOneLineOfFailureAndLeaveNoOutpu
       {"wavemill scpi -t 300 " + address + " 'FREQ 1e9' 'NOPE?'", 1, "",
        "wavemill: no answer to 'NOPE?' from " + address + " within 300 ms\n"},
       {"wavemill scpi " + address + " --block missing.bin 'MMEM:DATA \"w\"'", 1, "",
-       "wavemill: cannot open missing.bin" + noFile},
+       "wavemill: cannot open missing.bin: No such file or directory\n"},
       {"wavemill scpi " + address, 2, "", "wavemill: COMMAND is required\n"},
-      {"wavemill scpi " + address + " --read-block x.bin 'FREQ 1e9'", 2, "", "wavemill: --read-block needs a query"},
       {"wavemill identify TCPIP0::127.0.0.1::99999999999::SOCKET", 2, "", "wavemill: not an instrument address: "},
       {"wavemill wv pack bad.csv out.wv", 1, "", "wavemill: bad.csv:4: not a number: 'x'\n"},
       {"wavemill wv pack loud.csv out.wv", 1, "", "wavemill: loud.csv:2: value outside -1..1 (use --normalize"},
       {"wavemill wv pack good.csv out.wv -m short.mkr", 1, "", "wavemill: short.mkr holds fewer marker values"},
       {"wavemill wv pack good.csv no/such/folder/out.wv", 1, "", "wavemill: cannot create no/such/folder/out.wv: "},
       {"wavemill wv info good.csv", 1, "", "wavemill: good.csv is not a waveform file\n"},
-      {"wavemill wv unpack missing.wv out.csv", 1, "", "wavemill: cannot open missing.wv" + noFile},
-      {"wavemill wv pack good.csv", 2, "", "wavemill: OUT is required\n"},
-      {"wavemill wv pack good.csv out.wv --format wav", 2, "", "wavemill: --format: "},
-      {"wavemill wv pack good.csv out.wv --set nope=1", 2, "", "wavemill: --set: no header field called 'nope'"},
       {"wavemill frobnicate", 2, "", "wavemill: 'frobnicate' is no wavemill command\n"},
-      {"wavemill sim --fault wobble", 2, "", "wavemill: --fault: unknown mode 'wobble'"},
   };
   TempDir dir;
   writeAll(dir.path("good.csv"), "I,Q\n0.5,0.25\n-1,1\n");
