@@ -18,16 +18,13 @@ TEST(InstrumentIOSessionTest, CreatePicksTheTransportFromTheFormOfTheAddress) {
     int port;
   } cases[] = {
       {"", Kind::None, "", 0},
-      {"192.168.0.5", Kind::Lan, "192.168.0.5", 5025},
       {"GPIB0", Kind::Lan, "GPIB0", 5025},
-      {"tcpip0::Host::6000::socket", Kind::Lan, "Host", 6000},
       {"TCPIP0:: host :: 6000 ::SOCKET", Kind::Lan, "host", 6000},
       {"TCPIP0::host::0x10::SOCKET", Kind::Lan, "host", 5025},
       {"TCPIP0::1.2.3.4::INSTR", Kind::Lan, "1.2.3.4", 5025},
       {"TCPIP0::host", Kind::Lan, "TCPIP0::host", 5025},
       {"TCPIP0::host::inst0::INSTR", Kind::Visa, "TCPIP0::host::inst0::INSTR", 0},
       {"tcpip0::host::hislip0::instr", Kind::Visa, "tcpip0::host::hislip0::instr", 0},
-      {"USB0::0x0AAD::0x0054::100123::INSTR", Kind::Visa, "USB0::0x0AAD::0x0054::100123::INSTR", 0},
       {"usb-scope", Kind::Visa, "usb-scope", 0},
       {"GPIB0::7::INSTR", Kind::Visa, "GPIB0::7::INSTR", 0},
       {"ASRL1::INSTR", Kind::Visa, "ASRL1::INSTR", 0},
