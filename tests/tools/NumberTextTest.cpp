@@ -1,13 +1,4 @@
-#include "wavemill/json/ConverterBase.h"
-#include "wavemill/json/JsonSerializer.h"
-#include "wavemill/json/JsonToSettingVisitor.h"
-#include "wavemill/json/SettingToJsonVisitor.h"
-#include "wavemill/models/Activator.h"
-#include "wavemill/models/Prototype.h"
-#include "wavemill/tools/Tools.h"
-
 #include "tools/NumberText.h"
-#include "json/JsonTestModels.h"
 
 #include <gtest/gtest.h>
 
@@ -93,40 +84,4 @@ TEST(NumberTextTest, ReadsUnderADecimalCommaWhatStrtodReadsInTheCLocale) {
       EXPECT_EQ(read.value, value);
     }
   }
-}
-
-// One read and one write through each part that turns numbers into text or back.
-TEST(NumberTextTest, SettingsToolsConvertersAndDocumentsKeepTheDecimalPointUnderAGermanLocale) {
-  const ProcessLocale locale(german);
-  ASSERT_TRUE(locale.switched) << missing;
-  ASSERT_STREQ(std::localeconv()->decimal_point, ",") << "or nothing below is put to the test";
-
-  DoubleSetting parsed("Level"), converted("Level"), displayed("Level");
-  EXPECT_TRUE(parsed.parse("2.5"));
-  double tried = -99.0;
-  EXPECT_TRUE(Tools::tryParse(" -1.5E-3", tried));
-  Prototype::getInstance<DoubleConverter>()->convertBack(&converted, "0.75");
-  JsonToSettingVisitor reader(JsonSerializer::parse(R"({"Value": 1, "Min": -0.25})"));
-  displayed.visit(&reader);
-  const std::pair<double, double> reads[] = {
-      {parsed.getDouble(), 2.5}, {Tools::parseDouble(" 2.5V", 0), 2.5}, {Tools::parseFloat("0.25", 0), 0.25},
-      {tried, -1.5e-3},          {converted.getDouble(), 0.75},         {displayed.getMinimum(), -0.25}};
-  for (const auto &[read, expected] : reads)
-    EXPECT_EQ(read, expected);
-
-  DoubleSetting half("Half", 0.5, -0.25, 2.5, 0.0);
-  SettingToJsonVisitor display;
-  half.visit(&display);
-  EXPECT_EQ(half.toString(), "0.5");
-  EXPECT_EQ(display.getCurrent()->getItem("Min")->toString(), "-0.25");
-
-  JsonSerializer serializer;
-  serializer.getActivator()->registerType<JsonTests::Filter>("");
-  auto filter = std::make_shared<JsonTests::Filter>();
-  filter->cutoff->setValue(0.5);
-  const std::string document = serializer.serialize(filter);
-  EXPECT_NE(document.find("\"Cutoff\": 0.5,"), std::string::npos) << document;
-  const auto recalled = std::dynamic_pointer_cast<JsonTests::Filter>(serializer.deserialize(document));
-  ASSERT_NE(recalled, nullptr);
-  EXPECT_EQ(recalled->cutoff->getValue(), 0.5);
 }

@@ -90,6 +90,7 @@ TEST(ToolsTest, ParseFunctionsTakeTheLeadingNumberOrAnswerTheDefaultOrLeaveTheVa
   EXPECT_EQ(Tools::parseInt32("12345678901", 7), 7);
   EXPECT_EQ(Tools::parseInt32(" 42abc", 7), 42);
   EXPECT_EQ(Tools::parseInt64("9000000000", 0), 9000000000);
+  EXPECT_EQ(Tools::parseDouble(" 2.5V", 0), 2.5);
   EXPECT_EQ(Tools::parseFloat("0.25", 0), 0.25F);
   EXPECT_EQ(Tools::parseFloat("1e39", 3), 3.0F);
 
