@@ -7,7 +7,6 @@
 #include <chrono>
 #include <string>
 #include <thread>
-#include <utility>
 #include <vector>
 
 using namespace Corvane::Wavemill;
@@ -27,38 +26,25 @@ public:
   void send(const std::string &bytes) { Platform::sendAll(socket, bytes.data(), bytes.size()); }
   // One answer line without its line feed; empty on a time-out.
   std::string line() {
-    for (;;) {
-      if (const auto end = pending.find('\n'); end != std::string::npos) {
-        std::string answer = pending.substr(0, end);
-        pending.erase(0, end + 1);
-        return answer;
-      }
-      if (!receiveSome())
-        return {};
-    }
+    std::string answer;
+    for (char c = 0; Platform::receiveBytes(socket, &c, 1) == 1 && c != '\n';)
+      answer += c;
+    return answer;
   }
   // Everything that comes until a time-out or the end of the stream.
   std::string rest() {
-    while (receiveSome()) {
-    }
-    return std::exchange(pending, {});
+    std::string bytes;
+    char c = 0;
+    long received = 0;
+    while ((received = Platform::receiveBytes(socket, &c, 1)) == 1)
+      bytes += c;
+    ended = received == 0;
+    return bytes;
   }
 
   Platform::SocketHandle socket;
   bool connected = false;
   bool ended = false;
-
-private:
-  bool receiveSome() {
-    char chunk[65536];
-    const long received = Platform::receiveBytes(socket, chunk, sizeof chunk);
-    ended = received == 0;
-    if (received <= 0)
-      return false;
-    pending.append(chunk, static_cast<std::size_t>(received));
-    return true;
-  }
-  std::string pending;
 };
 
 } // namespace
