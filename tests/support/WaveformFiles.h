@@ -7,11 +7,11 @@
 #include <openssl/evp.h>
 #include <openssl/sha.h>
 
+#include <algorithm>
 #include <cstdint>
 #include <fstream>
 #include <iterator>
 #include <string>
-#include <utility>
 #include <vector>
 
 namespace Corvane::Wavemill::Testing {
@@ -99,21 +99,6 @@ inline Bytes encryptWaveform(const Bytes &plain) {
   return out;
 }
 
-/// One package of a decrypted waveform file.
-struct Package {
-  std::uint32_t tag = 0;
-  std::uint32_t length = 0;
-  Bytes body;              // `length` bytes, fewer if the file ends first
-  bool zeroPadded = false; // the bytes up to the next 16-byte boundary are 0
-};
-
-/// A waveform file taken apart: the 32 plain head bytes and the packages.
-struct WaveformFile {
-  std::size_t size = 0;
-  Bytes head;
-  std::vector<Package> packages;
-};
-
 /// AES-128-ECB decryption by OpenSSL: the files the library writes are read
 /// back by a cipher, and a key derivation, that owe nothing to it.
 inline Bytes opensslDecrypt(const unsigned char *key, const Bytes &cipher) {
@@ -128,69 +113,35 @@ inline Bytes opensslDecrypt(const unsigned char *key, const Bytes &cipher) {
   return plain;
 }
 
-/// Takes the file at `path` apart: the head under the file key, spelled out
-/// here so that the check does not borrow it, and the rest under the first
-/// 16 bytes of the SHA-1 of the plain head.
-inline WaveformFile openWaveform(const std::string &path) {
+/// Expects the file at `path` to decrypt to `expected` byte for byte but for
+/// the two salts, which it takes from the file: the head under the file key,
+/// spelled out here so that the check does not borrow it, and the rest under
+/// the first 16 bytes of the SHA-1 of the plain head. Answers the plain file.
+inline Bytes expectPlainWaveform(const std::string &path, Bytes expected) {
   static const unsigned char headKey[16] = {0x54, 0x0a, 0x1e, 0x71, 0x2a, 0xba, 0x28, 0x70,
                                             0xe9, 0x7b, 0x16, 0x19, 0x97, 0xe2, 0x99, 0xe0};
   const Bytes raw = readBytes(path);
-  WaveformFile file;
-  file.size = raw.size();
+  EXPECT_EQ(raw.size(), expected.size()) << path;
   if (raw.size() < 32) {
-    return file;
+    return raw;
   }
-  file.head = opensslDecrypt(headKey, Bytes(raw.begin(), raw.begin() + 32));
+  Bytes plain = opensslDecrypt(headKey, Bytes(raw.begin(), raw.begin() + 32));
   Bytes dataKey(SHA_DIGEST_LENGTH);
-  SHA1(file.head.data(), 32, dataKey.data());
-  const Bytes plain = opensslDecrypt(dataKey.data(), Bytes(raw.begin() + 32, raw.end()));
-  auto word = [&](std::size_t at) {
-    return std::uint32_t{plain[at]} << 24 | std::uint32_t{plain[at + 1]} << 16 | std::uint32_t{plain[at + 2]} << 8 |
-           plain[at + 3];
-  };
-  for (std::size_t pos = 0; pos + 8 <= plain.size();) {
-    Package p;
-    p.tag = word(pos);
-    p.length = word(pos + 4);
-    const std::size_t end = std::min<std::size_t>(pos + 8 + p.length, plain.size());
-    p.body.assign(plain.begin() + static_cast<std::ptrdiff_t>(pos + 8),
-                  plain.begin() + static_cast<std::ptrdiff_t>(end));
-    const std::size_t next = pad(end);
-    p.zeroPadded = true;
-    for (std::size_t k = end; k < next && k < plain.size(); ++k) {
-      p.zeroPadded = p.zeroPadded && plain[k] == 0;
-    }
-    file.packages.push_back(std::move(p));
-    pos = next;
-  }
-  return file;
+  SHA1(plain.data(), 32, dataKey.data());
+  const Bytes rest = opensslDecrypt(dataKey.data(), Bytes(raw.begin() + 32, raw.end()));
+  plain.insert(plain.end(), rest.begin(), rest.end());
+  std::copy(plain.begin() + 8, plain.begin() + 16, expected.begin() + 8);
+  std::copy(plain.begin() + 24, plain.begin() + 32, expected.begin() + 24);
+  EXPECT_TRUE(plain == expected) << path << " differs from the layout";
+  return plain;
 }
 
-/// Expects the file at `path` to be laid out byte for byte as the exporters
-/// write it: the first 16 bytes of `header` around two salts in the head,
-/// then the header package (tag 1, the rest of `header`), the IQ package and
-/// the marker package (tag 3), each with its length word, whole body and zero
-/// padding, and nothing more. Answers the file for further checks.
-inline WaveformFile expectWaveform(const std::string &path, const Bytes &header, const Bytes &iq, const Bytes &markers,
-                                   std::uint32_t iqTag = 2) {
-  const WaveformFile file = openWaveform(path);
-  EXPECT_EQ(file.size, 32 + pad(8 + header.size() - 16) + pad(8 + iq.size()) + pad(8 + markers.size()));
-  if (file.head.size() < 32 || file.packages.size() != 3) {
-    ADD_FAILURE() << path << " holds " << file.packages.size() << " packages";
-    return file;
-  }
-  EXPECT_EQ(Bytes(file.head.begin(), file.head.begin() + 8), Bytes(header.begin(), header.begin() + 8));
-  EXPECT_EQ(Bytes(file.head.begin() + 16, file.head.begin() + 24), Bytes(header.begin() + 8, header.begin() + 16));
-  const Bytes headerBody(header.begin() + 16, header.end());
-  const std::pair<std::uint32_t, const Bytes *> expected[] = {{1, &headerBody}, {iqTag, &iq}, {3, &markers}};
-  for (std::size_t k = 0; k < 3; ++k) {
-    SCOPED_TRACE("package " + std::to_string(k));
-    EXPECT_EQ(file.packages[k].tag, expected[k].first);
-    EXPECT_EQ(file.packages[k].length, expected[k].second->size());
-    EXPECT_TRUE(file.packages[k].body == *expected[k].second);
-    EXPECT_TRUE(file.packages[k].zeroPadded);
-  }
-  return file;
+/// Expects the file at `path` to be laid out as the exporters write it: the
+/// head, the header, IQ and (unless `markers` is null) marker packages, each
+/// with its length word, whole body and zero padding, and nothing more.
+inline Bytes expectWaveform(const std::string &path, const Bytes &header, const Bytes &iq, const Bytes *markers,
+                            std::uint32_t iqTag = 2) {
+  return expectPlainWaveform(path, plainWaveform(header, iq, markers, iqTag));
 }
 
 } // namespace Corvane::Wavemill::Testing
