@@ -140,23 +140,3 @@ TEST(ActivatorTest, ContainerKeepsTheFirstDescriptorAndAddsCollections) {
   EXPECT_EQ(container.getModels()[2]->getMetadata().getText("FullTypeName"),
             "System.Collections.ObjectModel.Collection`1[[RegistryTests.Bar]], mscorlib");
 }
-
-TEST(ActivatorTest, DescriptorsAnswerForTheirClass) {
-  auto foo = Prototype::getInstance<RuntimeType<Foo>>();
-  EXPECT_TRUE(foo->isAssignableFrom(std::make_shared<Foo>()));
-  EXPECT_FALSE(foo->isAssignableFrom(std::make_shared<Bar>()));
-  EXPECT_EQ(foo->getPrototype(), Prototype::getInstance<Foo>());
-  EXPECT_EQ(foo->getCollectionRuntimeType(), Prototype::getInstance<RuntimeType<ModelCollection<Foo>>>());
-
-  auto list = Prototype::getInstance<RuntimeType<ModelCollection<Foo>>>();
-  EXPECT_FALSE(list->isAssignableFrom(std::make_shared<ModelCollection<Foo>>()));
-  EXPECT_FALSE(list->getCollection());
-  EXPECT_FALSE(list->getCollectionRuntimeType());
-  EXPECT_EQ(list->getPrototype(), Prototype::getInstance<ModelCollection<Foo>>());
-
-  // The module is the one that registered the class: this program for Foo
-  // and its list, the library for TextModel.
-  EXPECT_EQ(foo->getLibraryName(), "wavemill_models_tests");
-  EXPECT_EQ(list->getLibraryName(), "wavemill_models_tests");
-  EXPECT_EQ(Prototype::getInstance<RuntimeType<TextModel>>()->getLibraryName(), "wavemill");
-}

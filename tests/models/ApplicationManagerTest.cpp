@@ -33,17 +33,9 @@ protected:
 
 using namespace ApplicationTests;
 
-// That the run-time state is not stored is read from the documents of the
-// json tests.
-TEST_F(ApplicationManagerTest, RunTimeStateIsNotReset) {
-  ApplicationBase application;
-  for (const auto &setting :
-       std::vector<std::shared_ptr<Setting>>{application.Selected, application.Dirty, application.Name})
-    EXPECT_FALSE(setting->isResettable()) << setting->getName();
-}
-
 TEST_F(ApplicationManagerTest, ALoneApplicationIsAlwaysSelected) {
   auto only = open();
+  EXPECT_FALSE(only->Dirty->isResettable()); // run-time state; that it is not stored: json tests
   EXPECT_TRUE(only->Selected->getValue());
   only->Selected->setValue(false); // the coupling sets it back
   EXPECT_TRUE(only->Selected->getValue());

@@ -219,13 +219,8 @@ TEST_F(TransactionTest, PropagationEntersAnotherTreeOnceAndGuardsLoops) {
   EXPECT_EQ(coupledWith, Transaction::empty().get());
 }
 
-TEST_F(TransactionTest, InterceptorKeepsServicesAndThreadIdsAreDistinct) {
-  EXPECT_EQ(interceptor.getService("missing"), nullptr);
+TEST_F(TransactionTest, InterceptorKeepsServices) {
   auto service = std::make_shared<ServiceBase>();
   interceptor.addService("svc", service);
   EXPECT_EQ(interceptor.getService("svc"), service);
-  std::uint32_t other = 0;
-  std::thread([&] { other = Interceptor::currentThreadId(); }).join();
-  EXPECT_NE(other, 0u);
-  EXPECT_NE(other, Interceptor::currentThreadId());
 }
