@@ -90,12 +90,10 @@ TEST_F(ToolsFileTest, FindFileMatchesTheEndOfThePathDepthFirstIgnoringCase) {
     file("", name);
   // A link back up the tree must not make the search endless.
   std::filesystem::create_directory_symlink(dir.root(), dir.path("sub/deep/loop"));
-  const std::pair<const char *, std::string> rows[] = {{"DEEP\\Target.CFG", dir.path("sub/deep/target.cfg")},
-                                                       {"me.txt", dir.path("readme.TXT")},
-                                                       {"t.dat", dir.path("t.dat")},
-                                                       {"other/target.cfg", ""}};
-  for (const auto &[name, found] : rows)
-    EXPECT_EQ(Tools::findFile(dir.root(), name), found) << name;
+  EXPECT_EQ(Tools::findFile(dir.root(), "DEEP\\Target.CFG"), dir.path("sub/deep/target.cfg"));
+  EXPECT_EQ(Tools::findFile(dir.root(), "me.txt"), dir.path("readme.TXT"));
+  EXPECT_EQ(Tools::findFile(dir.root(), "t.dat"), dir.path("t.dat"));
+  EXPECT_EQ(Tools::findFile(dir.root(), "other/target.cfg"), "");
   EXPECT_EQ(Tools::findFile(dir.path("absent"), "t.dat"), "");
 
   // Files and subfolders are listed one level deep only.
@@ -152,7 +150,6 @@ TEST(ToolsTest, LibraryNameLooksPastAnEarlierDotSoForTheVersionAtTheEnd) {
 }
 
 TEST(OperationSystemTest, ReportsTheBuildPlatformAndComparesByFields) {
-  EXPECT_TRUE(Tools::os().isLinux());
   EXPECT_EQ(Tools::os().toString(), "Linux");
   EXPECT_EQ(OperationSystem().toString(), "Windows");
   EXPECT_EQ(AppleOperationSystem().toString(), "Apple");
