@@ -35,8 +35,7 @@ TEST(StopwatchTest, ReportsStartAndEndAtInfoLevelAndOnlyTheTimeWithoutAName) {
   EXPECT_TRUE(std::regex_match(Stopwatch::now(false), std::regex("\\d{2}:\\d{2}:\\d{2}")));
 }
 
-TEST(StopwatchTest, ElapsedIsZeroUnstartedGrowsWhileRunningAndStaysAfterStop) {
-  EXPECT_EQ(Stopwatch("idle", nullptr).elapsedMilliseconds(), 0.0);
+TEST(StopwatchTest, ElapsedGrowsWhileRunningAndStaysAfterStop) {
   const auto running = Stopwatch::startNew("run", nullptr);
   std::this_thread::sleep_for(std::chrono::milliseconds(2));
   const double first = running->elapsedMilliseconds();
