@@ -43,13 +43,6 @@ std::shared_ptr<JObject> parseObject(const std::string &text, int &position) {
   return object;
 }
 
-std::vector<std::string> elements(const JArray &array) {
-  std::vector<std::string> texts;
-  for (const auto &token : array.getTokens())
-    texts.push_back(token->toString());
-  return texts;
-}
-
 } // namespace
 
 // The fixed layout with "$type" first is checked byte for byte by
@@ -79,13 +72,12 @@ TEST(JTokenTest, EscapingTouchesOnlyQuotedTextAndRawUndoesIt) {
 }
 
 TEST(JTokenTest, ValueReaderCountsOnlyBlanksAsWhiteSpaceAndStopsWhereTheLayoutWants) {
-  struct Case {
+  const struct {
     const char *text;
     int from;
     const char *value;
     int position;
-  };
-  const Case cases[] = {
+  } cases[] = {
       {": \t1,", 0, "\t1", 5},       // TAB is part of the value
       {"  5  , x", 0, "5", 5},       // a blank stops; position on the next non-blank
       {"7\r\n", 0, "7", 1},          // a CR stays for the caller
@@ -133,17 +125,10 @@ TEST(JTokenTest, ObjectReaderTakesMembersTheWayItsScannerSeesThem) {
     int position = 0;
     EXPECT_EQ(read(parseObject(c.text, position), c.name), c.value) << c.text << " " << c.name;
   }
+  // Arrays pass over `true`; "]" does not end a scalar.
   int position = 0;
-  auto object = parseObject(repeated, position);
-  EXPECT_EQ(object->getItemNames(), (std::vector<std::string>{"a", "b", "a"}));
-
-  position = 0;
-  object = parseObject("{\"a\": [true,\n1,\n\"x\"\n],\n\"b\": [1, 2]\n}", position);
-  auto a = std::dynamic_pointer_cast<JArray>(object->getItem("a"));
-  auto b = std::dynamic_pointer_cast<JArray>(object->getItem("b"));
-  ASSERT_TRUE(a && b);
-  EXPECT_EQ(elements(*a), (std::vector<std::string>{"1", "\"x\""}));
-  EXPECT_EQ(elements(*b), (std::vector<std::string>{"1", "2]"})); // "]" does not end a scalar
+  auto object = parseObject("{\"a\": [true,\n1,\n\"x\"\n],\n\"b\": [1, 2]\n}", position);
+  EXPECT_EQ(object->toString(), "{\n  \"a\": [\n    1,\n    \"x\"\n  ],\n  \"b\": [\n    1,\n    2]\n  ]\n}\n");
 }
 
 TEST(JTokenTest, ReaderReadsTheWritersOutputBack) {
@@ -166,8 +151,6 @@ TEST(JTokenTest, ReaderReadsTheWritersOutputBack) {
   int position = 0;
   auto again = parseObject(text, position);
   EXPECT_EQ(position, static_cast<int>(text.size()) - 1); // behind the "}", before the final LF
-  EXPECT_EQ(read(again, "Text"), quoted);
-  EXPECT_EQ(read(std::dynamic_pointer_cast<JObject>(again->getItem("Sub")), "Value"), "1");
   EXPECT_EQ(again->toString(), text);
 }
 
