@@ -91,10 +91,8 @@ TEST(ToolsTest, BuildMarkersClearsRunsOfFiveOrMoreLowSamplesThatAHighSampleEnds)
   Bytes markers(samples.size(), 0x80);
   Tools::buildMarkers(samples, markers, 2, 0.5);
   // The run of four and the run that lasts to the end keep their bit.
-  Bytes expected(samples.size(), 0x84);
-  for (int i = 1; i <= 5; ++i)
-    expected[i] = 0x80;
-  EXPECT_EQ(markers, expected);
+  EXPECT_EQ(markers, (Bytes{0x84, 0x80, 0x80, 0x80, 0x80, 0x80, 0x84, 0x84, 0x84, 0x84, 0x84, 0x84, 0x84, 0x84, 0x84,
+                            0x84, 0x84, 0x84}));
 
   Bytes untouched(samples.size(), 0x01);
   Tools::buildMarkers(samples, untouched, -1, 0.5);
