@@ -47,7 +47,7 @@ struct Flat {
   // ::close may also name the system call.
   void (*close)(CBlockImporter *) = find<void (*)(CBlockImporter *)>("_Z5closeP14CBlockImporter");
 
-  // Reads the file with the call order of a flat caller, 1000 bytes a read.
+  // Reads the file with the call order of a flat caller.
   void expectReadsBack(const std::string &path, const Bytes &header, const Bytes &iq, const Bytes &markers) {
     CBlockImporter *importer = CreateBlockImporter();
     unsigned char key[16];
@@ -60,12 +60,8 @@ struct Flat {
     EXPECT_EQ(static_cast<std::size_t>(GetDataLen(importer)), markers.size());
     EXPECT_EQ(GetWavformFormatFlag(importer), 0);
     for (auto [read, want] : {std::pair{GetData, &iq}, std::pair{GetMarkers, &markers}}) {
-      Bytes buffer(1000);
-      for (got.clear(); got.size() < want->size();) {
-        const int n = read(importer, buffer.data(), 1000);
-        ASSERT_GT(n, 0);
-        got.insert(got.end(), buffer.begin(), buffer.begin() + n);
-      }
+      got.assign(want->size(), 0);
+      EXPECT_EQ(read(importer, got.data(), static_cast<unsigned int>(got.size())), static_cast<int>(got.size()));
       EXPECT_EQ(got, *want);
     }
     close(importer);
