@@ -81,40 +81,29 @@ TEST_F(InstrumentTest, ArgumentFaultsThrowTheirTextAndSendNothing) {
   EXPECT_EQ(instrument->query("*IDN?", 0), SimulatorOptions().identity);
 }
 
+// An empty answer, which leaves nothing to compare with, is in the failure test.
 TEST_F(InstrumentTest, SendIfDifferentComparesNumbersByValueAndTextsByShortForm) {
-  TestInstrument quick(address(), 500); // an unknown header goes unanswered for the time-out
   const struct {
     const char *present;
     const char *command;
-    const char *outcome;
+    bool sent;
   } rows[] = {
-      {"FREQ +1.00000000E+009", "FREQ 1E9", "kept"},
-      {"FREQ +1.00000000E+009", "FREQ 2E9", "sent"},
-      {"UNIT VOLT", "UNIT VOLTAGE", "kept"},
-      {"UNIT VOLT", "UNIT voltage", "sent"},
-      {"UNIT VOLTAGE", "UNIT VOLT", "sent"},
-      {"FREQ 1E9", "FREQ -", "kept"},
-      {"*CLS", "NEVER 1", "invalid_argument: The SCPI command is incorrrect."},
+      {"FREQ +1.00000000E+009", "FREQ 1E9", false}, {"FREQ +1.00000000E+009", "FREQ 2E9", true},
+      {"UNIT VOLT", "UNIT VOLTAGE", false},         {"UNIT VOLT", "UNIT voltage", true},
+      {"UNIT VOLTAGE", "UNIT VOLT", true},          {"FREQ 1E9", "FREQ -", false},
   };
   for (const auto &row : rows) {
     SCOPED_TRACE(row.command);
-    quick.send(row.present);
-    quick.query("*OPC?", -1); // the simulator has taken the value in
+    instrument->send(row.present);
+    instrument->query("*OPC?", -1); // the simulator has taken the value in
     simulator.clearCommands();
     const std::string command = row.command;
-    std::string outcome;
-    if (const std::string error = thrown([&] { outcome = quick.sendIfDifferent(command) ? "sent" : "kept"; });
-        error != "nothing")
-      outcome = error;
-    EXPECT_EQ(outcome, row.outcome);
-    if (outcome == "sent" || outcome == "kept") {
-      // A command gets no answer: *OPC? makes sure the simulator has read it.
-      quick.query("*OPC?", -1);
-      const std::string query = command.substr(0, command.find(' ')) + "?";
-      const Strings wire = outcome == "sent" ? Strings{query, command, "*OPC?"} : Strings{query, "*OPC?"};
-      EXPECT_EQ(simulator.getCommands(), wire);
-      EXPECT_FALSE(quick.sendIfDifferent(command)); // the second push finds the value in place
-    }
+    EXPECT_EQ(instrument->sendIfDifferent(command), row.sent);
+    // A command gets no answer: *OPC? makes sure the simulator has read it.
+    instrument->query("*OPC?", -1);
+    const std::string query = command.substr(0, command.find(' ')) + "?";
+    EXPECT_EQ(simulator.getCommands(), row.sent ? (Strings{query, command, "*OPC?"}) : (Strings{query, "*OPC?"}));
+    EXPECT_FALSE(instrument->sendIfDifferent(command)); // the second push finds the value in place
   }
 }
 
