@@ -53,12 +53,6 @@ template <class Cipher> Bytes cipherBlocks(const unsigned char *key, const Bytes
   return out;
 }
 
-inline Bytes dataKeyOf(const Bytes &head) {
-  Bytes key(16);
-  EncryptKey::generateKey(head.data(), key.data());
-  return key;
-}
-
 /// The plain form of a waveform file, laid out by hand: the 32-byte head
 /// (header bytes 0-7, salt, header bytes 8-15, salt) and then each package
 /// as tag, length, body and zeros to a whole block. Tests change it (a
@@ -93,7 +87,9 @@ inline Bytes plainWaveform(const Bytes &header, const Bytes &iq, const Bytes *ma
 inline Bytes encryptWaveform(const Bytes &plain) {
   const Bytes head = cipherBlocks<Encryptor>(fixedFileKey, Bytes(plain.begin(), plain.begin() + 32));
   const auto whole = static_cast<std::ptrdiff_t>(32 + (plain.size() - 32) / 16 * 16);
-  Bytes out = cipherBlocks<Encryptor>(dataKeyOf(plain).data(), Bytes(plain.begin() + 32, plain.begin() + whole));
+  Bytes dataKey(16);
+  EncryptKey::generateKey(plain.data(), dataKey.data());
+  Bytes out = cipherBlocks<Encryptor>(dataKey.data(), Bytes(plain.begin() + 32, plain.begin() + whole));
   out.insert(out.begin(), head.begin(), head.end());
   out.insert(out.end(), plain.begin() + whole, plain.end());
   return out;

@@ -50,42 +50,11 @@ bool saltOfTime(const unsigned char *salt, std::time_t from, std::time_t to) {
 
 enum class Feed { Stream, Pairs, FloatPairs };
 
-struct Exported {
-  Bytes header = patternBytes(200, 51), iq, markers;
-};
-
 std::unique_ptr<Exporter2> exporterFor(bool floating, const std::string &path, Bytes &header, int headerLen) {
   if (floating) {
     return std::make_unique<streamingFloatExporter2>(path, header.data(), headerLen);
   }
   return std::make_unique<streamingExporter2>(path, header.data(), headerLen);
-}
-
-// Writes `samples` samples of IQ and markers in chunks of the sizes given
-// (the last one repeated): through stream(), or streamiq() and
-// streammarker() in pairs and then stop().
-Exported exportInChunks(const std::string &path, Feed feed, int samples, const std::vector<int> &chunks) {
-  Exported out;
-  const std::size_t width = feed == Feed::FloatPairs ? 8 : 4, total = static_cast<std::size_t>(samples);
-  out.iq = patternBytes(width * total, 52);
-  out.markers = patternBytes(total, 53);
-  auto exporter = exporterFor(feed == Feed::FloatPairs, path, out.header, 200);
-  EXPECT_TRUE(exporter->start(samples, true));
-  for (std::size_t at = 0, k = 0; at < total; ++k) {
-    const auto n = std::min<std::size_t>(static_cast<std::size_t>(chunks[std::min(k, chunks.size() - 1)]), total - at);
-    if (feed == Feed::Stream) {
-      EXPECT_TRUE(exporter->stream(&out.iq[at * 4], &out.markers[at], static_cast<int>(n), at + n == total));
-    } else {
-      EXPECT_TRUE(exporter->streamiq(&out.iq[at * width], static_cast<int>(n * width)));
-      EXPECT_TRUE(exporter->streammarker(&out.markers[at], static_cast<int>(n)));
-    }
-    at += n;
-  }
-  if (feed != Feed::Stream) {
-    exporter->stop();
-  }
-  EXPECT_FALSE(exporter->failed());
-  return out;
 }
 
 } // namespace
@@ -194,25 +163,47 @@ TEST(StreamingExporterTest, ChunksOfAnySizeJoinIntoOnePackageEachAndReadBack) {
               {"chunks of 1 MiB", Feed::Stream, 655'360, {mebi}},
               // at least 10^7 samples once, with markers
               {"10^7 samples in chunks of 1 MiB", Feed::Stream, 10'000'000, {mebi}}};
+  Bytes header = patternBytes(200, 51);
+  // Each row writes its samples in chunks of the sizes given (the last one
+  // repeated): through stream(), or streamiq() and streammarker() in pairs
+  // and then stop().
   for (const Row &row : rows) {
     SCOPED_TRACE(row.name);
     TempDir dir;
     const auto path = dir.path("w.wv");
     const bool floating = row.feed == Feed::FloatPairs;
-    const Exported sent = exportInChunks(path, row.feed, row.samples, row.chunks);
+    const std::size_t width = floating ? 8 : 4, total = static_cast<std::size_t>(row.samples);
+    Bytes sentIq = patternBytes(width * total, 52), sentMarkers = patternBytes(total, 53);
+    auto exporter = exporterFor(floating, path, header, 200);
+    EXPECT_TRUE(exporter->start(row.samples, true));
+    for (std::size_t at = 0, k = 0; at < total; ++k) {
+      const auto chunk = static_cast<std::size_t>(row.chunks[std::min(k, row.chunks.size() - 1)]);
+      const auto n = std::min(chunk, total - at);
+      if (row.feed == Feed::Stream) {
+        EXPECT_TRUE(exporter->stream(&sentIq[at * 4], &sentMarkers[at], static_cast<int>(n), at + n == total));
+      } else {
+        EXPECT_TRUE(exporter->streamiq(&sentIq[at * width], static_cast<int>(n * width)));
+        EXPECT_TRUE(exporter->streammarker(&sentMarkers[at], static_cast<int>(n)));
+      }
+      at += n;
+    }
+    if (row.feed != Feed::Stream) {
+      exporter->stop();
+    }
+    EXPECT_FALSE(exporter->failed());
     if (row.samples <= 1'000'000) { // the largest file only reads back
-      expectWaveform(path, sent.header, sent.iq, &sent.markers, floating ? 4 : 2);
+      expectWaveform(path, header, sentIq, &sentMarkers, floating ? 4 : 2);
     }
     EXPECT_FALSE(fs::exists(path + "_mkr"));
 
     streamingImporter2 importer;
     ASSERT_TRUE(importer.Open(widePath(path).c_str()));
     EXPECT_EQ(importer.GetIQDataLen(), row.samples);
-    Bytes iq(sent.iq.size()), markers(sent.markers.size());
+    Bytes iq(sentIq.size()), markers(sentMarkers.size());
     EXPECT_EQ(importer.GetRawIQData(iq.data(), static_cast<int>(iq.size())), static_cast<int>(iq.size()));
     EXPECT_EQ(importer.GetMarkers(markers.data(), row.samples), row.samples);
-    EXPECT_TRUE(iq == sent.iq);
-    EXPECT_TRUE(markers == sent.markers);
+    EXPECT_TRUE(iq == sentIq);
+    EXPECT_TRUE(markers == sentMarkers);
   }
 }
 
