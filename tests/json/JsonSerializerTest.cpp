@@ -56,7 +56,9 @@ TEST(JsonSerializerTest, WritesTheDocumentByteForByteAndReadsItBack) {
   JsonSerializer serializer;
   serializer.getActivator()->updateFullTypeNames("Asm", "Ns");
   auto filter = makeFilter();
-  ASSERT_EQ(serializer.serialize(filter), filterDocument);
+  const std::string text = serializer.serialize(filter);
+  ASSERT_EQ(text, filterDocument);
+  EXPECT_EQ(text.capacity(), text.size()); // sized before it was written
   // A list of lists is named, but only models are written as its items.
   auto laned = makeFilter();
   laned->lanes->getValue()->add(std::make_shared<Testing::Sources>());
