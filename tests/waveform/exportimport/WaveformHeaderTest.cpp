@@ -16,21 +16,17 @@ using Bytes = std::vector<unsigned char>;
 
 namespace {
 
-// The flag a field needs in order to be written.
-enum Needs { Always, Ext1, Ext2, Text, Block14 };
-
 struct Field {
   const char *name;
-  Needs needs;
   std::function<void(WaveformHeader &)> set;
   std::function<bool(const WaveformHeader &, const WaveformHeader &)> same;
 };
 
-template <typename T, typename U> Field field(const char *name, T WaveformHeader::*member, U value, Needs needs) {
-  return {name, needs, [=](WaveformHeader &h) { h.*member = static_cast<T>(value); },
+template <typename T, typename U> Field field(const char *name, T WaveformHeader::*member, U value) {
+  return {name, [=](WaveformHeader &h) { h.*member = static_cast<T>(value); },
           [=](const WaveformHeader &a, const WaveformHeader &b) { return a.*member == b.*member; }};
 }
-#define FIELD(name, value, ...) field(#name, &WaveformHeader::name, value, Needs(__VA_ARGS__ + 0))
+#define FIELD(name, value) field(#name, &WaveformHeader::name, value)
 
 // Every field, each set to a value unlike its default and its neighbours.
 const std::vector<Field> &fields() {
@@ -41,14 +37,14 @@ const std::vector<Field> &fields() {
       FIELD(tag7, 1), FIELD(tag8, 2), FIELD(tag9, 3), FIELD(tag10, 4), FIELD(tag11, 5), FIELD(tag12, 6),
       FIELD(tag13, 7), FIELD(tag15, 2.5), FIELD(tag16, 3.5), FIELD(tag17, 4.5), FIELD(tag22, 0x0102),
       FIELD(tag25, 5.5), FIELD(tag26, 9), FIELD(tag27, 6.5), FIELD(tag28, 7.5), FIELD(tag29, 8.5), FIELD(tag30, 9.5),
-      FIELD(tag31, 0x0304), FIELD(tag32, 10), FIELD(tag33, 10.5), FIELD(tag34, 11), FIELD(extension1, 12.5, Ext1),
-      FIELD(extension2, 13.5, Ext2), FIELD(block2Value, 12), FIELD(reservedText, std::string("opaque")),
+      FIELD(tag31, 0x0304), FIELD(tag32, 10), FIELD(tag33, 10.5), FIELD(tag34, 11), FIELD(extension1, 12.5),
+      FIELD(extension2, 13.5), FIELD(block2Value, 12), FIELD(reservedText, std::string("opaque")),
       FIELD(tag20, 14.5), FIELD(tag35, 'x'), FIELD(tag36, 15.5), FIELD(tag37, 16.5), FIELD(tag38, 17.5),
       FIELD(block4A, 18.5), FIELD(block4B, 19.5), FIELD(block5Value, 20.5), FIELD(block5Text, std::string("five")),
       FIELD(block6A, 21), FIELD(block6B, 22.5), FIELD(block6C, 0x0506), FIELD(block7A, 23.5), FIELD(block7B, 0x0708),
       FIELD(block8Value, 24.5), FIELD(block9Value, 0x090A0B0Cu), FIELD(tag41, 25), FIELD(tag42, 26.5),
-      FIELD(tag43, 27), FIELD(tag44, std::string("name")), FIELD(tag45, std::string("comment"), Text),
-      FIELD(tag46, std::string("more"), Text), FIELD(block14Value, 28.5, Block14)};
+      FIELD(tag43, 27), FIELD(tag44, std::string("name")), FIELD(tag45, std::string("comment")),
+      FIELD(tag46, std::string("more")), FIELD(block14Value, 28.5)};
   // clang-format on
   return all;
 }
@@ -64,7 +60,7 @@ WaveformHeader fullRecord(bool ext1, bool ext2, bool text, bool block14) {
 
 } // namespace
 
-TEST(WaveformHeaderTest, WrittenRecordReadsBackFieldForField) {
+TEST(WaveformHeaderTest, WrittenRecordReadsBackToTheSameBytes) {
   const bool rows[][4] = {
       {false, false, false, false}, {false, true, false, false}, {true, false, true, false}, {true, true, true, true}};
   for (const auto &row : rows) {
@@ -72,16 +68,11 @@ TEST(WaveformHeaderTest, WrittenRecordReadsBackFieldForField) {
     WaveformHeader written = fullRecord(row[0], row[1], row[2], row[3]);
     Bytes bytes = written.getHeaderBytes();
     EXPECT_EQ(static_cast<int>(bytes.size()), written.getHeaderLength());
+    // Every field differs from its default, so a field read wrong or not at
+    // all writes other bytes; so do the flags.
     WaveformHeader read;
     read.setHeaderBytes(bytes);
-    const WaveformHeader fresh;
-    const bool present[] = {true, written.hasExtension1, written.hasExtension2, written.hasTextBlocks,
-                            written.hasBlock14};
-    for (const auto &f : fields()) {
-      SCOPED_TRACE(f.name);
-      EXPECT_TRUE(f.same(read, present[f.needs] ? written : fresh));
-    }
-    EXPECT_EQ(read.getHeaderBytes(), bytes) << "the flags read back too; the second extension brings the first";
+    EXPECT_EQ(read.getHeaderBytes(), bytes) << "the second extension brings the first";
   }
 }
 
