@@ -1,3 +1,12 @@
+#include "wavemill/json/ConverterBase.h"
+#include "wavemill/json/JsonSerializer.h"
+#include "wavemill/json/JsonToSettingVisitor.h"
+#include "wavemill/json/SettingToJsonVisitor.h"
+#include "wavemill/models/Activator.h"
+#include "wavemill/models/Prototype.h"
+#include "wavemill/tools/Tools.h"
+
+#include "support/TestModels.h"
 #include "tools/NumberText.h"
 
 #include <gtest/gtest.h>
@@ -84,4 +93,38 @@ TEST(NumberTextTest, ReadsUnderADecimalCommaWhatStrtodReadsInTheCLocale) {
       EXPECT_EQ(read.value, value);
     }
   }
+}
+
+// A desktop application runs under the user's locale: settings, Tools,
+// converters, display data and documents still read and write a decimal point.
+TEST(NumberTextTest, EveryLayerKeepsTheDecimalPointUnderAGermanLocale) {
+  const ProcessLocale locale(german);
+  ASSERT_TRUE(locale.switched) << missing;
+  ASSERT_STREQ(std::localeconv()->decimal_point, ",") << "or nothing below is put to the test";
+
+  DoubleSetting setting("Level");
+  EXPECT_TRUE(setting.parse("2.5"));
+  EXPECT_EQ(setting.getDouble(), 2.5);
+  EXPECT_EQ(Tools::parseDouble(" 2.5V", 0), 2.5);
+  Prototype::getInstance<DoubleConverter>()->convertBack(&setting, "-0.5");
+  EXPECT_EQ(setting.getDouble(), -0.5);
+  JsonToSettingVisitor reader(JsonSerializer::parse(R"({"Value": 1, "Min": -0.25})"));
+  setting.visit(&reader);
+  EXPECT_EQ(setting.getMinimum(), -0.25);
+
+  DoubleSetting half("Half", 0.5, -0.25, 2.5, 0.0);
+  EXPECT_EQ(half.toString(), "0.5");
+  SettingToJsonVisitor display;
+  half.visit(&display);
+  EXPECT_EQ(display.getCurrent()->getItem("Min")->toString(), "-0.25");
+
+  JsonSerializer serializer;
+  serializer.getActivator()->registerType<Testing::Source>("");
+  auto source = std::make_shared<Testing::Source>();
+  source->level->setValue(-0.5);
+  const std::string document = serializer.serialize(source);
+  EXPECT_NE(document.find("\"Level\": -0.5,"), std::string::npos) << document;
+  const auto recalled = std::dynamic_pointer_cast<Testing::Source>(serializer.deserialize(document));
+  ASSERT_NE(recalled, nullptr);
+  EXPECT_EQ(recalled->level->getValue(), -0.5);
 }
