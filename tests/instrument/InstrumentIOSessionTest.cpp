@@ -1,7 +1,6 @@
 #include "wavemill/instrument/InstrumentIOSession.h"
 
 #include "support/ExpectThrow.h"
-#include "support/TestInstrument.h"
 #include "wavemill/instrument/LanIOSession.h"
 #include "wavemill/instrument/VisaIOSession.h"
 
@@ -41,15 +40,4 @@ TEST(InstrumentIOSessionTest, CreatePicksTheTransportFromTheFormOfTheAddress) {
   }
   EXPECT_EQ(Testing::thrown([] { InstrumentIOSession::create("TCPIP0::host::123456789012::SOCKET"); }),
             "out_of_range: stoi argument out of range");
-}
-
-TEST(InstrumentIOSessionTest, QueryAnswersTheLineAndQueryArrayTheRawBlock) {
-  Testing::SimulatedBench bench;
-  const auto session = InstrumentIOSession::create(bench.address());
-  ASSERT_TRUE(session->connect());
-  EXPECT_EQ(session->query("*IDN?"), "Corvane,SG200,100123,1.4.2");
-  std::vector<unsigned char> zeros(1000, 0);
-  session->writeBlock("MMEM:DATA 'zeros',", zeros);
-  // Zero bytes do not end the text.
-  EXPECT_EQ(session->queryArray("MMEM:DATA? 'zeros'"), std::string(1000, '\0'));
 }

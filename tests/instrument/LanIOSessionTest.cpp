@@ -96,20 +96,17 @@ TEST(LanIOSessionReadTest, ReadsKeepFullBuffersAndDropShortPiecesAndBlocksTakeTh
 }
 
 // The exact bytes of lines and blocks on the wire are checked through the
-// instrument's block writes.
+// instrument's block writes. Zero bytes do not end the text of queryArray.
 TEST_F(LanIOSessionTest, BlocksFarLargerThanOneSegmentAreCollectedWhole) {
   std::vector<unsigned char> big(64 << 20);
   for (std::size_t i = 0; i < big.size(); ++i)
     big[i] = static_cast<unsigned char>(i * 7 % 251);
   session.writeBlock("MMEM:DATA 'big',", big);
-  EXPECT_TRUE(session.readBlock("MMEM:DATA? 'big'") == big);
+  EXPECT_TRUE(session.queryArray("MMEM:DATA? 'big'") == std::string(big.begin(), big.end()));
 }
 
 TEST(LanIOSessionConnectTest, ConnectFailsOnRefusalButNotOnAnUnfinishedHandshake) {
-  const auto closed = Platform::listenTcp("127.0.0.1", 0, 1);
-  const int closedPort = Platform::localPort(closed);
-  Platform::closeSocket(closed);
-  EXPECT_FALSE(LanIOSession("127.0.0.1", closedPort).connect());
+  EXPECT_FALSE(LanIOSession("127.0.0.1", 1).connect()); // nothing listens on port 1
   EXPECT_FALSE(LanIOSession("", 5025).connect());
 
   // A listener that never accepts, with its queue filled by a first client,
