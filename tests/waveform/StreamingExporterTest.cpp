@@ -60,30 +60,17 @@ std::unique_ptr<Exporter2> exporterFor(bool floating, const std::string &path, B
 } // namespace
 
 TEST(Exporter2Test, FileHoldsHeadHeaderIqAndMarkerPackagesByteForByte) {
-  // An odd header, an odd count of samples filling several file buffers and
+  // An odd header, an odd count of samples with the peak in the last, and
   // more marker channels than the 4 a sample keeps.
   TempDir dir;
   const Bytes h = patternBytes(23, 5);
-  constexpr std::size_t n = 1001, channels = 6;
-  std::vector<double> i(n), q(n);
-  Bytes markers(n * channels), iq, packed(n);
-  for (std::size_t k = 0; k < markers.size(); ++k) {
-    markers[k] = static_cast<unsigned char>(k % 3 == 0 ? 0 : k);
-  }
-  // Samples at the peak and at a quarter of it, of either sign.
-  for (std::size_t s = 0; s < n; ++s) {
-    i[s] = s % 2 == 0 ? 0.4 : -0.1;
-    q[s] = -i[s];
-    const Bytes sample = s % 2 == 0 ? Bytes{0x7f, 0xff, 0x80, 0x01} : Bytes{0xe0, 0x00, 0x20, 0x00};
-    iq.insert(iq.end(), sample.begin(), sample.end());
-    for (std::size_t c = 0; c < 4; ++c) {
-      packed[s] |= markers[s * channels + c] != 0 ? 1 << c : 0;
-    }
-  }
+  double i[] = {0.5, 0.0, 1.0}, q[] = {0.0, -0.25, 0.0};
+  unsigned char markers[] = {0, 0, 0, 2, 9, 9, 1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 5, 5};
   const std::time_t before = std::time(nullptr);
   WholeExporter exporter(dir.path("w.wv"), const_cast<unsigned char *>(h.data()), 23);
-  EXPECT_TRUE(exporter.setData(i.data(), q.data(), markers.data(), static_cast<int>(n), static_cast<int>(channels)));
+  EXPECT_TRUE(exporter.setData(i, q, markers, 3, 6));
   const std::time_t after = std::time(nullptr);
+  const Bytes iq = {0x40, 0x00, 0x00, 0x00, 0x00, 0x00, 0xe0, 0x00, 0x7f, 0xff, 0x00, 0x00}, packed = {0x08, 0x01, 0};
   const Bytes plain = expectWaveform(dir.path("w.wv"), h, iq, &packed);
   ASSERT_GE(plain.size(), 32u);
   EXPECT_TRUE(saltOfTime(&plain[8], before, after));
