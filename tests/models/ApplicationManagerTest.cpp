@@ -36,8 +36,7 @@ using namespace ApplicationTests;
 TEST_F(ApplicationManagerTest, ALoneApplicationIsAlwaysSelected) {
   auto only = open();
   EXPECT_FALSE(only->Dirty->isResettable()); // run-time state; that it is not stored: json tests
-  EXPECT_TRUE(only->Selected->getValue());
-  only->Selected->setValue(false); // the coupling sets it back
+  only->Selected->setValue(false);           // the coupling sets it back
   EXPECT_TRUE(only->Selected->getValue());
   EXPECT_EQ(seen, (std::vector<std::string>{"Context:add", "Selected:"}));
 }

@@ -3,36 +3,18 @@
 
 #include <gtest/gtest.h>
 
-#include <functional>
-
 using namespace Corvane::Wavemill;
 
 namespace {
 
-// Runs a hook when it is bound, to look at its model at that moment.
-class HookSetting : public StringSetting {
-public:
-  using StringSetting::StringSetting;
-  void activate(Interceptor *interceptor, IModel *owner) override {
-    StringSetting::activate(interceptor, owner);
-    if (hook)
-      hook();
-  }
-  std::function<void()> hook;
-};
-
-// A Source with a second setting named "Count", a hooked setting and a
-// count of its initialisations.
+// A Source with a second setting named "Count".
 struct Probe : Testing::Source {
   WAVEMILL_MODEL(Probe)
-  void initialize() override { ++initializations; }
   void change() {
     level->setValue(7.25);
     label->setValue("busy");
   }
   std::shared_ptr<Int32Setting> shadow = init(std::make_shared<Int32Setting>("Count"));
-  std::shared_ptr<HookSetting> probe = init(std::make_shared<HookSetting>("Probe"));
-  int initializations = 0;
 };
 
 // The same settings as Probe, but another class.
@@ -56,32 +38,23 @@ protected:
 
 } // namespace
 
-TEST_F(ModelBaseTest, ContextComesFirstTypeNameDropsNamespaceAndFirstOfEqualSettingNamesWins) {
+TEST_F(ModelBaseTest, TypeNameDropsNamespaceAndFirstOfEqualSettingNamesWins) {
   ModelBase plain("A::B::C");
   EXPECT_EQ(plain.getTypeName(), "C");
   EXPECT_EQ(ModelBase("Flat").getTypeName(), "Flat");
-  EXPECT_EQ(model->getAllSettings()[0], model->getContext());
   EXPECT_EQ(model->getSetting("Level"), model->level);
   EXPECT_EQ(model->getSetting("Count"), model->count);
   EXPECT_EQ(model->getSetting("Absent"), nullptr);
 }
 
-TEST_F(ModelBaseTest, ActivationBindsInOrderAndDeactivationIsTerminal) {
+TEST_F(ModelBaseTest, ActivationNeedsATreeAndDeactivationIsTerminal) {
   Probe parent;
   auto child = std::make_shared<Probe>();
-  bool ownerSetFirst = false;
-  child->probe->hook = [&] {
-    ownerSetFirst =
-        child->initializations == 1 && child->getOwner() == &parent && child->getInterceptor() == &interceptor;
-    child->init(std::make_shared<BoolSetting>("Late"));
-  };
   child->activateSettings(nullptr, &parent);
   EXPECT_EQ(child->getOwner(), nullptr);
   child->setThisKey("Slot");
 
   child->activateSettings(&interceptor, &parent);
-  EXPECT_TRUE(ownerSetFirst);
-  EXPECT_EQ(child->getAllSettings().back()->getInterceptor(), &interceptor); // appended during activation
   EXPECT_EQ(child->getThisKey(), "Slot");
 
   child->deactivateSettings();
@@ -145,7 +118,6 @@ TEST_F(ModelBaseTest, CopyFromTakesSameClassOnlyByPositionInOneEdit) {
   EXPECT_FALSE(model->copyFrom(nullptr));
   EXPECT_FALSE(model->copyFrom(model));
   EXPECT_FALSE(model->copyFrom(std::make_shared<Twin>())); // same layout, another class
-  EXPECT_EQ(couples, 0);
 
   EXPECT_TRUE(model->copyFrom(source));
   EXPECT_EQ(couples, 1);
