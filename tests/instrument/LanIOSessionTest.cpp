@@ -54,7 +54,7 @@ private:
 class LanIOSessionTest : public ::testing::Test, protected Testing::SimulatedBench {
 protected:
   void SetUp() override { ASSERT_TRUE(session.connect()); }
-  LanIOSession session{"127.0.0.1", port()};
+  LanIOSession session{"127.0.0.1", simulator.getPort()};
 };
 
 } // namespace

@@ -103,13 +103,9 @@ TEST(SimulatedInstrumentTest, FaultsBreakAnswersTheWayTheyAnnounce) {
     const char *received;
     bool closed;
   } rows[] = {
-      {SimulatorFault::None, "#2100123456789\n", false},
-      {SimulatorFault::Trickle, "#2100123456789\n", false},
-      {SimulatorFault::NoTerminator, "#2100123456789", false},
-      {SimulatorFault::GarbageBlock, "garbage\n", false},
-      {SimulatorFault::ShortBlock, "#21001234", false},
-      {SimulatorFault::CloseMidBlock, "#21001234", true},
-      {SimulatorFault::Stall, "", false},
+      {SimulatorFault::Trickle, "#2100123456789\n", false}, {SimulatorFault::NoTerminator, "#2100123456789", false},
+      {SimulatorFault::GarbageBlock, "garbage\n", false},   {SimulatorFault::ShortBlock, "#21001234", false},
+      {SimulatorFault::CloseMidBlock, "#21001234", true},   {SimulatorFault::Stall, "", false},
       {SimulatorFault::RefuseConnections, "", true},
   };
   for (const auto &row : rows) {

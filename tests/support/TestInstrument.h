@@ -29,7 +29,6 @@ struct SimulatedBench {
       : simulator(std::move(options)),
         instrument(std::make_shared<TestInstrument>(simulator.getAddress(), timeoutInMS)) {}
   std::string address() const { return simulator.getAddress(); }
-  int port() const { return simulator.getPort(); }
 
   SimulatedInstrument simulator;
   std::shared_ptr<TestInstrument> instrument;
