@@ -201,7 +201,6 @@ TEST(StreamingExporterTest, RunsOutOfOrderGiveTheirOwnResultsAndFiles) {
   {
     streamingExporter2 e(target, h.data(), 16);
     EXPECT_FALSE(e.stream(iq.data(), m.data(), 4, true)); // before start
-    EXPECT_EQ(fs::file_size(target), 0u);
     EXPECT_TRUE(e.start(16, false));
     EXPECT_FALSE(e.start(16, false));
     EXPECT_FALSE(e.stream(nullptr, m.data(), 4, false));
