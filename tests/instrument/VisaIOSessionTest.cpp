@@ -71,6 +71,7 @@ TEST_F(VisaIOSessionTest, BlockWritesGoInPiecesWithEndBeforeTheLastOne) {
        {endOff, "viWrite 1024", endOff, "viWrite 1024"},
        text(pattern(2048))},
       {"nothing", [&] { session.writeManyBlocks({}); }, {endOff}, ""},
+      {"end", [&] { session.writeManyBlocksEnd(); }, {endOff, endOn, "viWrite 1"}, std::string(1, '\0')},
       {"block",
        [&] { session.writeBlock("MMEM:DATA 'a',", five); },
        {endOff, endOff, "viWrite 16", endOff, endOff, "viWrite 5", endOff, endOn, "viWrite 1"},
