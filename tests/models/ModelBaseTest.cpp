@@ -3,18 +3,34 @@
 
 #include <gtest/gtest.h>
 
+#include <functional>
+
 using namespace Corvane::Wavemill;
 
 namespace {
 
-// A Source with a second setting named "Count".
+// Runs a hook when it is bound, to look at its model at that moment.
+struct HookSetting : StringSetting {
+  using StringSetting::StringSetting;
+  void activate(Interceptor *interceptor, IModel *owner) override {
+    StringSetting::activate(interceptor, owner);
+    if (hook)
+      hook();
+  }
+  std::function<void()> hook;
+};
+
+// A Source with a second setting named "Count" that counts its initializations.
 struct Probe : Testing::Source {
   WAVEMILL_MODEL(Probe)
+  void initialize() override { ++initializations; }
   void change() {
     level->setValue(7.25);
     label->setValue("busy");
   }
   std::shared_ptr<Int32Setting> shadow = init(std::make_shared<Int32Setting>("Count"));
+  std::shared_ptr<HookSetting> probe = init(std::make_shared<HookSetting>("Probe"));
+  int initializations = 0;
 };
 
 // The same settings as Probe, but another class.
@@ -50,11 +66,20 @@ TEST_F(ModelBaseTest, TypeNameDropsNamespaceAndFirstOfEqualSettingNamesWins) {
 TEST_F(ModelBaseTest, ActivationNeedsATreeAndDeactivationIsTerminal) {
   Probe parent;
   auto child = std::make_shared<Probe>();
+  // Initialized, owned and in the tree before its settings bind; a setting
+  // appended while they bind is bound in the same pass.
+  bool readyFirst = false;
+  child->probe->hook = [&] {
+    readyFirst = child->initializations == 1 && child->getOwner() == &parent && child->getInterceptor() == &interceptor;
+    child->init(std::make_shared<BoolSetting>("Late"));
+  };
   child->activateSettings(nullptr, &parent);
   EXPECT_EQ(child->getOwner(), nullptr);
   child->setThisKey("Slot");
 
   child->activateSettings(&interceptor, &parent);
+  EXPECT_TRUE(readyFirst);
+  EXPECT_EQ(child->getAllSettings().back()->getInterceptor(), &interceptor);
   EXPECT_EQ(child->getThisKey(), "Slot");
 
   child->deactivateSettings();
