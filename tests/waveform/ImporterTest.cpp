@@ -60,11 +60,9 @@ TEST_F(ImporterTest, SamplesReadBackAsBigEndianSixteenBitValuesOverFullScale) {
 TEST_F(ImporterTest, AFileDecryptedInOnePassIsServedFromMemoryWithMarkersUnpackedToBits) {
   WholeImporter importer;
   EXPECT_EQ(importer.load(file), static_cast<int>(readBytes(file).size())); // far more than the staging area
-  ASSERT_EQ(importer.GetHeaderLength(), 40);
   Bytes got(4004, 0xee);
   EXPECT_EQ(importer.GetHeader(got.data(), 40), 40);
   EXPECT_TRUE(std::equal(header.begin(), header.end(), got.begin()));
-  ASSERT_EQ(importer.GetIQDataLen(), 1000);
   EXPECT_EQ(importer.GetRawIQData(got.data(), 4000), 4000);
   EXPECT_TRUE(std::equal(iq.begin(), iq.end(), got.begin()));
   EXPECT_EQ(importer.GetDataPtr(got.data(), 0), 0);
