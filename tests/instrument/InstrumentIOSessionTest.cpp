@@ -25,7 +25,6 @@ TEST(InstrumentIOSessionTest, CreatePicksTheTransportFromTheFormOfTheAddress) {
       {"TCPIP0::host::inst0::INSTR", Kind::Visa, "TCPIP0::host::inst0::INSTR", 0},
       {"tcpip0::host::hislip0::instr", Kind::Visa, "tcpip0::host::hislip0::instr", 0},
       {"usb-scope", Kind::Visa, "usb-scope", 0},
-      {"GPIB0::7::INSTR", Kind::Visa, "GPIB0::7::INSTR", 0},
       {"ASRL1::INSTR", Kind::Visa, "ASRL1::INSTR", 0},
   };
   for (const auto &row : cases) {

@@ -98,9 +98,7 @@ TEST(LanIOSessionReadTest, ReadsKeepFullBuffersAndDropShortPiecesAndBlocksTakeTh
 // The exact bytes of lines and blocks on the wire are checked through the
 // instrument's block writes. Zero bytes do not end the text of queryArray.
 TEST_F(LanIOSessionTest, BlocksFarLargerThanOneSegmentAreCollectedWhole) {
-  std::vector<unsigned char> big(64 << 20);
-  for (std::size_t i = 0; i < big.size(); ++i)
-    big[i] = static_cast<unsigned char>(i * 7 % 251);
+  auto big = Testing::pattern(64 << 20);
   session.writeBlock("MMEM:DATA 'big',", big);
   EXPECT_TRUE(session.queryArray("MMEM:DATA? 'big'") == std::string(big.begin(), big.end()));
 }

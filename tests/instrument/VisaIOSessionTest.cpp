@@ -56,10 +56,7 @@ TEST_F(VisaIOSessionTest, InstrumentWorksOnAVisaSessionAsOnLan) {
 
 TEST_F(VisaIOSessionTest, BlockWritesGoInPiecesWithEndBeforeTheLastOne) {
   auto five = pattern(5);
-  const auto writeParts = [&](std::size_t size) {
-    auto part = pattern(size);
-    session.writeManyBlocks(part);
-  };
+  auto whole = pattern(2048);
   const struct {
     const char *name;
     std::function<void()> write;
@@ -67,7 +64,7 @@ TEST_F(VisaIOSessionTest, BlockWritesGoInPiecesWithEndBeforeTheLastOne) {
     std::string wire;
   } rows[] = {
       {"whole pieces",
-       [&] { writeParts(2048); },
+       [&] { session.writeManyBlocks(whole); },
        {endOff, "viWrite 1024", endOff, "viWrite 1024"},
        text(pattern(2048))},
       {"nothing", [&] { session.writeManyBlocks({}); }, {endOff}, ""},
