@@ -25,13 +25,12 @@ using Text = std::pair<std::string, std::string>;
 TEST(ToolsTest, SplitTrimTrimsEachPieceTrimOnlyTheEndsAndReplaceNeverRescans) {
   EXPECT_EQ(Tools::splitTrim("\"x\" ;\t y", ";", " \t\""), (Pieces{"x", "y"}));
   // Trimming removes members of the set only at the chosen ends.
-  const Text trimmed[] = {
-      {Tools::trim("   ", ' '), ""}, {Tools::trim(" a ", ""), " a "}, {Tools::trim("xyaxby", "xy"), "axb"}};
+  EXPECT_EQ(Tools::trim("   ", ' '), "");
+  EXPECT_EQ(Tools::trim(" a ", ""), " a ");
+  EXPECT_EQ(Tools::trim("xyaxby", "xy"), "axb");
   // Replacing goes left to right without rescanning what it put in.
-  const Text replaced[] = {{Tools::replace("aaa", "aa", "b"), "ba"}, {Tools::replace("abc", "b", "bb"), "abbc"}};
-  for (const auto &rows : {gsl::span<const Text>(trimmed), gsl::span<const Text>(replaced)})
-    for (const auto &[result, expected] : rows)
-      EXPECT_EQ(result, expected);
+  EXPECT_EQ(Tools::replace("aaa", "aa", "b"), "ba");
+  EXPECT_EQ(Tools::replace("abc", "b", "bb"), "abbc");
 }
 
 TEST(ToolsTest, CaseAndQuotesWorkOnBytesAndAppendTakesOnlyAPositiveCount) {
@@ -125,7 +124,7 @@ TEST(ToolsTest, ClipAndRoundFormsDifferInGridOriginDirectionAndHalves) {
     EXPECT_EQ(Tools::clip(value, low, high, step), result) << value << " " << low << " " << high << " " << step;
   // round takes halves away from zero and steps back above high.
   const std::array<double, 5> rounded[] = {
-      {10, 0, 10, 4, 8}, {2, 0, 10, 4, 4}, {-2, -10, 10, 4, -4}, {3.3, 0, 2, 5, 2}, {5, 10, 0, 0, 0}};
+      {10, 0, 10, 4, 8}, {2, 0, 10, 4, 4}, {-2, -10, 10, 4, -4}, {3.3, 0, 2, 5, 2}};
   for (const auto &[value, low, high, step, result] : rounded)
     EXPECT_EQ(Tools::round(value, low, high, step), result) << value << " " << low << " " << high << " " << step;
 }
